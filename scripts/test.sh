@@ -1,0 +1,37 @@
+#!/usr/bin/env bash
+# The whole test suite: a release build and an AddressSanitizer +
+# UndefinedBehaviorSanitizer build, both with warnings as errors, then the
+# fuzz targets for a bounded time.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+bash scripts/setup.sh
+
+jobs=$(nproc 2>/dev/null || echo 2)
+
+echo "== release build"
+cmake -S . -B build -DCMAKE_BUILD_TYPE=Release >/dev/null
+cmake --build build -j"$jobs"
+(cd build && ctest --output-on-failure -j"$jobs")
+
+echo "== address and undefined-behaviour sanitizer build"
+cmake -S . -B build-asan -DCMAKE_BUILD_TYPE=RelWithDebInfo -DCVN_SANITIZE=ON -DCVN_BENCH=OFF >/dev/null
+cmake --build build-asan -j"$jobs"
+(cd build-asan && ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
+   ctest --output-on-failure -j"$jobs")
+
+echo "== fuzz targets (bounded)"
+CXX=clang++ cmake -S . -B build-fuzz -DCMAKE_BUILD_TYPE=RelWithDebInfo -DCVN_FUZZ=ON \
+  -DCVN_SANITIZE=ON -DCVN_TESTS=OFF -DCVN_BENCH=OFF >/dev/null
+cmake --build build-fuzz -j"$jobs"
+seconds="${CVN_FUZZ_SECONDS:-30}"
+for target in build-fuzz/*_fuzz; do
+  [ -x "$target" ] || continue
+  name=$(basename "$target")
+  seeds="fuzz/corpus/${name%_fuzz}"
+  work=$(mktemp -d)
+  [ -d "$seeds" ] && cp -r "$seeds"/. "$work"/
+  echo "-- $name for ${seconds}s"
+  "$target" -max_total_time="$seconds" -rss_limit_mb=2048 -print_final_stats=0 "$work" 2>&1 | tail -n 3
+  rm -rf "$work"
+done
+echo "all builds and tests passed"

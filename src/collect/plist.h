@@ -1,0 +1,51 @@
+// Property lists as the profiler prints them, read by our own expat-based
+// reader on every platform, with the value kinds CoreFoundation gives.
+#ifndef CVN_COLLECT_PLIST_H_
+#define CVN_COLLECT_PLIST_H_
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace cvn {
+
+struct PlistEntry;
+
+/// One property-list value. Dictionaries keep their keys in document order
+/// (a repeated key keeps its first position and takes the last value).
+struct PlistValue {
+  enum class Kind { kString, kInteger, kReal, kDate, kBoolean, kData, kArray, kDictionary };
+
+  Kind kind = Kind::kString;
+  /// kString: the bytes as they are; kData: the decoded bytes.
+  std::string text;
+  /// kInteger: the value (literals up to 2^64-1 keep their low 64 bits);
+  /// kDate: seconds since 1970-01-01T00:00:00Z; kBoolean: 0 or 1.
+  int64_t integer = 0;
+  /// kReal.
+  double real = 0.0;
+  std::vector<PlistValue> array;
+  std::vector<PlistEntry> dictionary;
+
+  bool isString() const { return kind == Kind::kString; }
+  bool isArray() const { return kind == Kind::kArray; }
+  bool isDictionary() const { return kind == Kind::kDictionary; }
+  /// Dictionary lookup by exact key; null when absent or not a dictionary.
+  const PlistValue* find(std::string_view key) const;
+};
+
+struct PlistEntry {
+  std::string key;
+  PlistValue value;
+};
+
+/// Parses an XML property list. Returns false (and leaves `out` empty) only
+/// when the text is not XML at all; a document that breaks off or holds a
+/// value CoreFoundation could not read keeps everything else that was read.
+/// `warning`, when given, receives a description of the first problem.
+bool parsePlist(std::string_view document, PlistValue* out, std::string* warning = nullptr);
+
+}  // namespace cvn
+
+#endif  // CVN_COLLECT_PLIST_H_

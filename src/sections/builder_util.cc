@@ -1,0 +1,74 @@
+#include "sections/builder_util.h"
+
+#include <cstdarg>
+#include <cstdio>
+
+#include "zxml/size_text.h"
+
+namespace cvn {
+
+const Tag* findItems(const TagTree& raw, std::string_view data_type) {
+  const Tag* type = raw.top().findChild(data_type);
+  return type ? type->findChild("_items") : nullptr;
+}
+
+const Tag* findFirstItem(const TagTree& raw, std::string_view data_type) {
+  const Tag* items = findItems(raw, data_type);
+  return items ? items->firstChild() : nullptr;
+}
+
+const TagValue* rawValue(const Tag& item, std::string_view key) {
+  const TagProperty* p = item.findProperty(key);
+  return p ? &p->value() : nullptr;
+}
+
+std::string rawText(const Tag& item, std::string_view key) {
+  const TagValue* v = rawValue(item, key);
+  return v && v->isText() ? v->text() : std::string();
+}
+
+bool hasKey(const Tag& item, std::string_view key) { return item.findProperty(key) != nullptr; }
+
+void copyField(Tag& record, std::string_view field, const Tag& item, std::string_view key) {
+  const TagValue* v = rawValue(item, key);
+  record.setProperty(field, v ? *v : TagValue());
+}
+
+void copyFieldIfPresent(Tag& record, std::string_view field, const Tag& item,
+                        std::string_view key) {
+  if (const TagValue* v = rawValue(item, key)) record.setProperty(field, *v);
+}
+
+std::string flagText(std::string_view text, std::string_view yes) {
+  return text == yes ? "1" : "0";
+}
+
+int64_t sizeInMegabytes(std::string_view size_text) {
+  float mb = static_cast<float>(SizeText::toGigabytes(size_text) * 1024.0);
+  if (!(mb > -9.2e18f && mb < 9.2e18f)) return 0;
+  return static_cast<int64_t>(mb);
+}
+
+Tag& addComplexRecord(Tag& parent, std::string_view name) {
+  parent.setProperty(name, TagValue(""), "complex", "");
+  return parent.addChild(name);
+}
+
+std::string formatText(const char* format, ...) {
+  va_list args;
+  va_start(args, format);
+  va_list copy;
+  va_copy(copy, args);
+  int n = std::vsnprintf(nullptr, 0, format, copy);
+  va_end(copy);
+  std::string out;
+  if (n > 0) {
+    out.resize(static_cast<size_t>(n) + 1);
+    std::vsnprintf(&out[0], out.size(), format, args);
+    out.resize(static_cast<size_t>(n));
+  }
+  va_end(args);
+  return out;
+}
+
+}  // namespace cvn

@@ -1,0 +1,46 @@
+// What every section builder shares: finding a data type's items in the raw
+// tree, reading raw keys as text, and the common field conversions.
+#ifndef CVN_SECTIONS_BUILDER_UTIL_H_
+#define CVN_SECTIONS_BUILDER_UTIL_H_
+
+#include <string>
+#include <string_view>
+
+#include "zxml/tag.h"
+
+namespace cvn {
+
+/// The "_items" tag under the raw top tag's child `data_type`, or null.
+const Tag* findItems(const TagTree& raw, std::string_view data_type);
+/// The first child of "_items" of `data_type`, or null.
+const Tag* findFirstItem(const TagTree& raw, std::string_view data_type);
+
+/// The raw key's value, or null when the key is missing.
+const TagValue* rawValue(const Tag& item, std::string_view key);
+/// The raw key's text: its value when that is text, else empty.
+std::string rawText(const Tag& item, std::string_view key);
+bool hasKey(const Tag& item, std::string_view key);
+
+/// Copy: sets `field` to the raw value whatever its kind; a missing key gives
+/// an empty value (the property is still created).
+void copyField(Tag& record, std::string_view field, const Tag& item, std::string_view key);
+/// Copy, but only when the key is present.
+void copyFieldIfPresent(Tag& record, std::string_view field, const Tag& item,
+                        std::string_view key);
+
+/// "1" when `text` equals `yes` exactly, else "0".
+std::string flagText(std::string_view text, std::string_view yes);
+
+/// SizeText::toGigabytes x 1024, narrowed to float, truncated to an integer.
+int64_t sizeInMegabytes(std::string_view size_text);
+
+/// A complex record: the parent gets an empty-text property named `name`
+/// annotated "complex", then the child tag of that name is added.
+Tag& addComplexRecord(Tag& parent, std::string_view name);
+
+/// printf into a std::string.
+std::string formatText(const char* format, ...) __attribute__((format(printf, 1, 2)));
+
+}  // namespace cvn
+
+#endif  // CVN_SECTIONS_BUILDER_UTIL_H_

@@ -1,0 +1,48 @@
+// The section builders, one per file, called in order by the post-processing
+// pipeline. Each reads the raw "Macintosh" tree (never changing it) and adds
+// its section under the snapshot's top tag. None reports a status: missing
+// data means a missing section, record or field.
+#ifndef CVN_SECTIONS_SECTIONS_H_
+#define CVN_SECTIONS_SECTIONS_H_
+
+#include "zxml/tag.h"
+
+namespace cvn {
+
+class CommandRunner;
+class FileSystem;
+
+/// "System": computer system, chassis, memory slots, power management.
+void buildSystemSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner);
+/// "Processors".
+void buildProcessorsSection(TagTree& snapshot, const TagTree& raw);
+/// "Memory".
+void buildMemorySection(TagTree& snapshot, const TagTree& raw);
+/// "Video": video adapters and monitors with EDID decoding.
+void buildDisplaysSection(TagTree& snapshot, const TagTree& raw);
+/// "Storage": physical disks, drives and volumes.
+void buildStorageSection(TagTree& snapshot, const TagTree& raw);
+/// "Network"/"Adapters".
+void buildNetworkAdaptersSection(TagTree& snapshot, const TagTree& raw);
+/// "Peripherals": printers and scanners.
+void buildPrintersSection(TagTree& snapshot, const TagTree& raw);
+/// USB devices and removable media.
+void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner);
+/// "OS".
+void buildOperatingSystemSection(TagTree& snapshot, const TagTree& raw);
+/// "User-accounts", from `ls` and `dscl`.
+void buildUsersSection(TagTree& snapshot, CommandRunner& runner);
+/// "Software": applications.
+void buildApplicationsSection(TagTree& snapshot, const TagTree& raw);
+/// "InternetPlug-Ins" and "Libraries" under "Software".
+void buildPlugInsSection(TagTree& snapshot, FileSystem& fs, CommandRunner& runner);
+/// "Processes": a copy of the raw tree's process list.
+void buildProcessesSection(TagTree& snapshot, const TagTree& raw);
+/// "Environment", from `env`.
+void buildEnvironmentSection(TagTree& snapshot, CommandRunner& runner);
+/// "Security"/"Firewall".
+void buildFirewallSection(TagTree& snapshot, const TagTree& raw);
+
+}  // namespace cvn
+
+#endif  // CVN_SECTIONS_SECTIONS_H_

@@ -1,0 +1,332 @@
+#include "zxml/tag.h"
+
+#include <cinttypes>
+#include <cstdio>
+#include <cstring>
+
+namespace cvn {
+
+// ---------------------------------------------------------------- TagValue
+
+TagValue& TagValue::operator=(const TagValue& other) {
+  // A source of type none is deliberately a no-op, not a clear.
+  if (this == &other || other.type_ == Type::kNone) return *this;
+  clear();
+  type_ = other.type_;
+  int_ = other.int_;
+  real_ = other.real_;
+  text_ = other.text_;
+  return *this;
+}
+
+TagValue& TagValue::operator=(TagValue&& other) {
+  if (this == &other || other.type_ == Type::kNone) return *this;
+  clear();
+  type_ = other.type_;
+  int_ = other.int_;
+  real_ = other.real_;
+  text_ = std::move(other.text_);
+  return *this;
+}
+
+void TagValue::clear() {
+  type_ = Type::kNone;
+  int_ = 0;
+  real_ = 0.0;
+  std::string().swap(text_);
+}
+
+size_t TagValue::textLength() const {
+  char buf[512];
+  switch (type_) {
+    case Type::kNone:
+      return 0;
+    case Type::kBool:
+      return int_ ? 4 : 5;
+    case Type::kInt:
+      return static_cast<size_t>(std::snprintf(buf, sizeof buf, "%" PRId64, int_));
+    case Type::kReal:
+      // Huge doubles print hundreds of digits with "%.2lf"; snprintf measures
+      // them exactly even when they do not fit the scratch buffer.
+      return static_cast<size_t>(std::snprintf(buf, sizeof buf, "%.2lf", real_));
+    case Type::kText:
+      return text_.size();
+  }
+  return 0;
+}
+
+size_t TagValue::writeText(char* out) const {
+  switch (type_) {
+    case Type::kNone:
+      *out = '\0';
+      return 0;
+    case Type::kBool:
+      std::memcpy(out, int_ ? "true" : "false", int_ ? 5 : 6);
+      return int_ ? 4 : 5;
+    case Type::kInt:
+      return static_cast<size_t>(std::sprintf(out, "%" PRId64, int_));
+    case Type::kReal:
+      return static_cast<size_t>(std::sprintf(out, "%.2lf", real_));
+    case Type::kText:
+      std::memcpy(out, text_.data(), text_.size());
+      out[text_.size()] = '\0';
+      return text_.size();
+  }
+  return 0;
+}
+
+std::string TagValue::textForm() const {
+  std::string s(textLength() + 1, '\0');
+  s.resize(writeText(&s[0]));
+  return s;
+}
+
+void TagValue::printToStderr() const {
+  std::string s = textForm();
+  std::fwrite(s.data(), 1, s.size(), stderr);
+}
+
+bool TagValue::operator==(const TagValue& o) const {
+  if (type_ != o.type_) return false;
+  switch (type_) {
+    case Type::kNone:
+      return true;
+    case Type::kBool:
+    case Type::kInt:
+      return int_ == o.int_;
+    case Type::kReal:
+      return real_ == o.real_;
+    case Type::kText:
+      return text_ == o.text_;
+  }
+  return false;
+}
+
+// ------------------------------------------------------------- TagProperty
+
+void TagProperty::addAnnotation(std::string key, std::string text) {
+  annotations_.push_back(Annotation{std::move(key), std::move(text)});
+}
+
+void TagProperty::setAnnotation(std::string_view key, std::string_view text) {
+  for (Annotation& a : annotations_) {
+    if (a.key == key) {
+      a.text = std::string(text);
+      return;
+    }
+  }
+  annotations_.push_back(Annotation{std::string(key), std::string(text)});
+}
+
+const Annotation* TagProperty::findAnnotation(std::string_view key) const {
+  for (const Annotation& a : annotations_)
+    if (a.key == key) return &a;
+  return nullptr;
+}
+
+// --------------------------------------------------------------------- Tag
+
+Tag::Tag(Kind kind, std::string name) : kind_(kind), name_(std::move(name)) {}
+
+Tag* Tag::findChild(std::string_view name) const {
+  if (!child_index_.empty()) {
+    auto it = child_index_.find(std::string(name));
+    return it == child_index_.end() ? nullptr : it->second;
+  }
+  for (const auto& c : children_)
+    if (c->name_ == name) return c.get();
+  return nullptr;
+}
+
+TagProperty* Tag::findProperty(std::string_view name) const {
+  if (!property_index_.empty()) {
+    auto it = property_index_.find(std::string(name));
+    return it == property_index_.end() ? nullptr : it->second;
+  }
+  for (const auto& p : properties_)
+    if (p->name() == name) return p.get();
+  return nullptr;
+}
+
+void Tag::makeBranch() {
+  if (kind_ == Kind::kLeaf) kind_ = Kind::kBranch;
+}
+
+Tag& Tag::appendChild(std::string_view name) {
+  makeBranch();
+  children_.push_back(std::make_unique<Tag>(Kind::kLeaf, std::string(name)));
+  Tag* child = children_.back().get();
+  if (!child_index_.empty()) {
+    child_index_.emplace(child->name_, child);  // keeps the first match
+  } else if (children_.size() > kIndexThreshold) {
+    for (const auto& c : children_) child_index_.emplace(c->name_, c.get());
+  }
+  return *child;
+}
+
+Tag& Tag::addChild(std::string_view name) {
+  if (Tag* existing = findChild(name)) {
+    makeBranch();
+    return *existing;
+  }
+  return appendChild(name);
+}
+
+Tag& Tag::setChildValue(std::string_view name, const TagValue& value) {
+  Tag& child = addChild(name);
+  child.setValue(value);
+  return child;
+}
+
+void Tag::setValue(const TagValue& value) {
+  if (!value_) {
+    value_ = std::make_unique<TagValue>(value);
+  } else {
+    *value_ = value;
+  }
+}
+
+TagProperty& Tag::setProperty(std::string_view name, const TagValue& value, const char* note_key,
+                              const char* note_text) {
+  if (TagProperty* existing = findProperty(name)) {
+    existing->setValue(value);
+    return *existing;
+  }
+  properties_.push_back(std::make_unique<TagProperty>(std::string(name)));
+  TagProperty& prop = *properties_.back();
+  prop.setValue(value);
+  if (note_key && note_text) prop.addAnnotation(note_key, note_text);
+  if (!property_index_.empty()) {
+    property_index_.emplace(prop.name(), &prop);
+  } else if (properties_.size() > kIndexThreshold) {
+    for (const auto& p : properties_) property_index_.emplace(p->name(), p.get());
+  }
+  return prop;
+}
+
+void Tag::addAnnotation(std::string key, std::string text) {
+  annotations_.push_back(Annotation{std::move(key), std::move(text)});
+}
+
+std::string Tag::nextNumberedName(std::string_view base) const {
+  std::string name;
+  for (unsigned long n = 1;; ++n) {
+    name.assign(base);
+    name += std::to_string(n);
+    if (!findChild(name)) return name;
+  }
+}
+
+Tag* Tag::stepInto(std::string_view segment, bool create) {
+  Tag* child = findChild(segment);
+  if (!child && create) child = &appendChild(segment);
+  return child;
+}
+
+TagProperty& Tag::setPropertyByPath(std::string_view path, const TagValue& value,
+                                    const char* note_key, const char* note_text) {
+  Tag* current = this;
+  if (!path.empty() && path.front() == '/') {
+    path.remove_prefix(1);
+    // A tag without children has no top to step into; stay where we are.
+    if (Tag* first = current->firstChild()) current = first;
+  }
+  for (size_t slash = path.find('/'); slash != std::string_view::npos; slash = path.find('/')) {
+    current->makeBranch();
+    current = current->stepInto(path.substr(0, slash), true);
+    // A tag that a path step lands on counts as a branch even when it only
+    // ever receives properties ("/a/b/c" leaves both a and b branches).
+    current->makeBranch();
+    path.remove_prefix(slash + 1);
+  }
+  TagProperty* prop = current->findProperty(path);
+  if (!prop) return current->setProperty(path, value, note_key, note_text);
+  prop->setValue(value);
+  if (note_key && note_text) prop->setAnnotation(note_key, note_text);
+  return *prop;
+}
+
+void Tag::annotateByPath(std::string_view path, const std::string& key, const std::string& text) {
+  Tag* current = this;
+  for (;;) {
+    if (!path.empty() && path.front() == '/') {
+      path.remove_prefix(1);
+      current = current->firstChild();
+      if (!current) return;
+    }
+    size_t slash = path.find('/');
+    if (slash == std::string_view::npos) {
+      if (Tag* target = current->findChild(path)) target->addAnnotation(key, text);
+      return;
+    }
+    current->makeBranch();
+    current = current->findChild(path.substr(0, slash));
+    if (!current) return;
+    // The "/" stays, so the walk goes on in the found child's first child.
+    path.remove_prefix(slash);
+  }
+}
+
+void Tag::annotatePropertyByPath(std::string_view path, const std::string& key,
+                                 const std::string& text) {
+  Tag* current = this;
+  if (!path.empty() && path.front() == '/') {
+    path.remove_prefix(1);
+    current = current->firstChild();
+    if (!current) return;
+  }
+  for (size_t slash = path.find('/'); slash != std::string_view::npos; slash = path.find('/')) {
+    current->makeBranch();
+    current = current->findChild(path.substr(0, slash));
+    if (!current) return;
+    path.remove_prefix(slash + 1);
+  }
+  if (TagProperty* prop = current->findProperty(path)) prop->addAnnotation(key, text);
+}
+
+void Tag::copyFrom(const Tag& other) {
+  if (this == &other) return;
+  kind_ = other.kind_;
+  name_ = other.name_;
+  value_ = other.value_ ? std::make_unique<TagValue>(*other.value_) : nullptr;
+  annotations_ = other.annotations_;
+  properties_.clear();
+  property_index_.clear();
+  for (const auto& p : other.properties_) {
+    TagProperty& prop = setProperty(p->name(), TagValue());
+    prop.value() = p->value();
+    for (const Annotation& a : p->annotations()) prop.addAnnotation(a.key, a.text);
+  }
+  children_.clear();
+  child_index_.clear();
+  for (const auto& c : other.children_) appendCopyOf(*c);
+  // Duplicate names are legal: appending copies, not setProperty, keeps them.
+}
+
+Tag& Tag::appendCopyOf(const Tag& other) {
+  Tag& child = appendChild(other.name_);
+  child.copyFrom(other);
+  return child;
+}
+
+// ----------------------------------------------------------------- TagTree
+
+TagTree::TagTree(bool native_byte_order, std::string_view top_name)
+    : native_byte_order_(native_byte_order),
+      document_(std::make_unique<Tag>(Tag::Kind::kDocument, std::string())) {
+  // The top tag starts as a leaf; it becomes a branch with its first child.
+  document_->addChild(top_name);
+}
+
+TagTree::TagTree(const TagTree& other)
+    : native_byte_order_(other.native_byte_order_),
+      document_(std::make_unique<Tag>(Tag::Kind::kDocument, std::string())) {
+  document_->copyFrom(*other.document_);
+}
+
+TagProperty& TagTree::setValue(std::string_view path, const TagValue& value, const char* note_key,
+                               const char* note_text) {
+  return document_->setPropertyByPath(path, value, note_key, note_text);
+}
+
+}  // namespace cvn
