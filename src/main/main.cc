@@ -1,1 +1,3 @@
-int main() { return 0; }
+#include "main/command_line.h"
+
+int main(int argc, char** argv) { return cvn::runAgent(argc, argv); }

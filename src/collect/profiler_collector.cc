@@ -1,0 +1,93 @@
+#include "collect/profiler_collector.h"
+
+namespace cvn {
+
+const std::string_view kProfilerHeader =
+    "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+    "<!DOCTYPE plist PUBLIC \"-//Apple//DTD PLIST 1.0//EN\" "
+    "\"http://www.apple.com/DTDs/PropertyList-1.0.dtd\">\n"
+    "<plist version=\"1.0\">\n"
+    "<array>\n";
+const std::string_view kProfilerFooter = "</array>\n</plist>\n";
+
+namespace {
+
+constexpr size_t kProfilerChunk = 65536;
+
+struct Step {
+  const char* data_type;
+  const char* progress;  // printed after the step, or null
+};
+
+// The order is fixed: the first type keeps the document header, the last
+// one the footer.
+constexpr Step kSteps[] = {
+    {"SPHardwareDataType", nullptr},        {"SPNetworkDataType", "10%\n"},
+    {"SPSoftwareDataType", nullptr},        {"SPParallelATADataType", "20%\n"},
+    {"SPAudioDataType", nullptr},           {"SPBluetoothDataType", "30%\n"},
+    {"SPFireWireDataType", nullptr},        {"SPDisplaysDataType", "40%\n"},
+    {"SPMemoryDataType", nullptr},          {"SPPrintersDataType", "50%\n"},
+    {"SPSerialATADataType", nullptr},       {"SPParallelSCSIDataType", nullptr},
+    {"SPUSBDataType", "60%\n"},             {"SPAirPortDataType", nullptr},
+    {"SPFirewallDataType", "70%\n"},        {"SPNetworkLocationDataType", nullptr},
+    {"SPNetworkVolumeDataType", "80%\n"},   {"SPApplicationsDataType", nullptr},
+    {"SPStartupItemDataType", "90%\n"},     {"SPDiscBurningDataType", nullptr},
+    {"SPPowerDataType", nullptr},
+};
+
+}  // namespace
+
+std::string ProfilerCollector::runProfiler(std::string_view data_type, Trim trim) {
+  std::string command = "system_profiler -detailLevel full -xml ";
+  command += data_type;
+  std::string output;
+  // Deliberately unbounded: every data type is waited for rather than left
+  // out of the inventory.
+  do {
+    output = runner_.run(command, kProfilerChunk);
+  } while (output.empty());
+
+  const size_t head = kProfilerHeader.size();
+  const size_t foot = kProfilerFooter.size();
+  switch (trim) {
+    case Trim::kFirst:
+      if (output.size() < foot + 1) return std::string();
+      output.resize(output.size() - foot);
+      return output;
+    case Trim::kMiddle:
+      if (output.size() < head + foot + 1) return std::string();
+      return output.substr(head, output.size() - head - foot);
+    case Trim::kLast:
+      if (output.size() < head + 1) return std::string();
+      return output.substr(head);
+  }
+  return std::string();
+}
+
+std::string ProfilerCollector::collect(bool progress, std::FILE* out) {
+  std::string document;
+  constexpr size_t kStepCount = sizeof kSteps / sizeof kSteps[0];
+  for (size_t i = 0; i < kStepCount; ++i) {
+    const Step& step = kSteps[i];
+    Trim trim = i == 0 ? Trim::kFirst : i + 1 == kStepCount ? Trim::kLast : Trim::kMiddle;
+    std::string part = runProfiler(step.data_type, trim);
+    if (!part.empty()) {
+      document += part;
+    } else if (trim == Trim::kFirst) {
+      document += kProfilerHeader;
+    } else if (trim == Trim::kLast) {
+      document += kProfilerFooter;
+    }
+    if (progress && step.progress) {
+      std::fputs(step.progress, out);
+      std::fflush(out);
+    }
+  }
+  if (progress) {
+    std::fputs("100%\n", out);
+    std::fflush(out);
+  }
+  return document;
+}
+
+}  // namespace cvn

@@ -1,0 +1,38 @@
+// Runs system_profiler once per data type and splices the outputs into one
+// property-list document whose root array holds one dictionary per type.
+#ifndef CVN_COLLECT_PROFILER_COLLECTOR_H_
+#define CVN_COLLECT_PROFILER_COLLECTOR_H_
+
+#include <cstdio>
+#include <string>
+#include <string_view>
+
+#include "collect/command_runner.h"
+
+namespace cvn {
+
+/// The profiler's own document header (172 bytes) and footer (18 bytes).
+extern const std::string_view kProfilerHeader;
+extern const std::string_view kProfilerFooter;
+
+class ProfilerCollector {
+ public:
+  /// Which ends of one tool output are cut before splicing.
+  enum class Trim { kMiddle = 0, kFirst = 1, kLast = 2 };
+
+  explicit ProfilerCollector(CommandRunner& runner) : runner_(runner) {}
+
+  /// The spliced document. With `progress` the percentages go to `out`.
+  std::string collect(bool progress, std::FILE* out);
+
+  /// One data type's output, cut by byte count; empty when it is too short
+  /// for the cut. A tool that prints nothing is asked again until it does.
+  std::string runProfiler(std::string_view data_type, Trim trim);
+
+ private:
+  CommandRunner& runner_;
+};
+
+}  // namespace cvn
+
+#endif  // CVN_COLLECT_PROFILER_COLLECTOR_H_

@@ -1,0 +1,165 @@
+#include "collect/quick_facts.h"
+
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+
+#include "collect/command_runner.h"
+#include "sections/edid.h"
+#include "zxml/size_text.h"
+
+namespace cvn {
+
+const char kPlatformUuidCommand[] =
+    "ioreg -rd1 -c IOPlatformExpertDevice | awk '/IOPlatformUUID/ { split($0, line, \"\\\"\"); "
+    "printf(\"%s\", line[4]); }'";
+
+namespace {
+
+const PlistValue* firstItem(const PlistValue& root, std::string_view data_type) {
+  const PlistValue* items = findProfilerItems(root, data_type);
+  return items && !items->array.empty() ? &items->array.front() : nullptr;
+}
+
+std::string stringAt(const PlistValue* dict, std::string_view key) {
+  if (!dict) return std::string();
+  const PlistValue* v = dict->find(key);
+  return v && v->isString() ? v->text : std::string();
+}
+
+std::string wholeNumber(double value) {
+  if (!(value >= 0 && value < 1e18)) return "0";
+  char buf[32];
+  std::snprintf(buf, sizeof buf, "%lld", static_cast<long long>(value));
+  return buf;
+}
+
+std::string oneDecimal(double value) {
+  char buf[64];
+  std::snprintf(buf, sizeof buf, "%.1f", std::isfinite(value) ? value : 0.0);
+  return buf;
+}
+
+std::string integerText(const PlistValue* dict, std::string_view key) {
+  if (!dict) return std::string();
+  const PlistValue* v = dict->find(key);
+  if (!v) return std::string();
+  if (v->kind == PlistValue::Kind::kInteger) return std::to_string(v->integer);
+  if (v->isString()) return v->text;
+  return std::string();
+}
+
+void readDisplays(const PlistValue& root, QuickFacts* facts) {
+  const PlistValue* items = findProfilerItems(root, "SPDisplaysDataType");
+  if (!items) return;
+  bool have_vram = false;
+  for (const PlistValue& adapter : items->array) {
+    if (!have_vram) {
+      std::string vram = stringAt(&adapter, "spdisplays_vram");
+      if (vram.empty()) vram = stringAt(&adapter, "spdisplays_vram_shared");
+      if (!vram.empty()) {
+        facts->video_memory = wholeNumber(SizeText::toKilobytes(vram) / 1024.0);
+        have_vram = true;
+      }
+    }
+    const PlistValue* displays = adapter.find("spdisplays_ndrvs");
+    if (!displays || !displays->isArray()) continue;
+    for (const PlistValue& display : displays->array) {
+      if (stringAt(&display, "spdisplays_main") != "spdisplays_yes") continue;
+      facts->main_display_resolution = stringAt(&display, "spdisplays_resolution");
+      std::vector<uint8_t> edid = edidBytesFromText(stringAt(&display, "_spdisplays_edid"));
+      if (edid.size() >= 128) facts->main_display_size = edidDiagonalText(edid.data());
+      return;
+    }
+  }
+}
+
+void readDisks(const PlistValue& root, QuickFacts* facts) {
+  const PlistValue* controllers = findProfilerItems(root, "SPSerialATADataType");
+  if (!controllers) return;
+  double disks = 0, volumes = 0, free = 0;
+  bool any_disk = false, any_volume = false;
+  for (const PlistValue& controller : controllers->array) {
+    const PlistValue* devices = controller.find("_items");
+    if (!devices || !devices->isArray()) continue;
+    for (const PlistValue& device : devices->array) {
+      std::string size = stringAt(&device, "size");
+      if (size.empty()) continue;
+      disks += SizeText::toGigabytes(size);
+      any_disk = true;
+      const PlistValue* vols = device.find("volumes");
+      if (!vols || !vols->isArray()) continue;
+      for (const PlistValue& volume : vols->array) {
+        volumes += SizeText::toGigabytes(stringAt(&volume, "size"));
+        free += SizeText::toGigabytes(stringAt(&volume, "free_space"));
+        any_volume = true;
+      }
+    }
+  }
+  if (any_disk) facts->disk_capacity = oneDecimal(disks);
+  if (any_volume) {
+    facts->volume_capacity = oneDecimal(volumes);
+    facts->volume_free = oneDecimal(free);
+  }
+}
+
+}  // namespace
+
+const PlistValue* findProfilerItems(const PlistValue& root, std::string_view data_type) {
+  if (!root.isArray()) return nullptr;
+  for (const PlistValue& entry : root.array) {
+    if (!entry.isDictionary()) continue;
+    const PlistValue* type = entry.find("_dataType");
+    if (!type || !type->isString() || type->text != data_type) continue;
+    const PlistValue* items = entry.find("_items");
+    return items && items->isArray() ? items : nullptr;
+  }
+  return nullptr;
+}
+
+QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
+  QuickFacts facts;
+  const PlistValue* software = firstItem(root, "SPSoftwareDataType");
+  facts.local_host_name = stringAt(software, "local_host_name");
+  std::string user = stringAt(software, "user_name");
+  size_t open = user.find('(');
+  if (open != std::string::npos) {
+    size_t close = user.find(')', open + 1);
+    if (close != std::string::npos) facts.user_name = user.substr(open + 1, close - open - 1);
+  }
+  facts.os_version = stringAt(software, "os_version");
+
+  const PlistValue* hardware = firstItem(root, "SPHardwareDataType");
+  facts.platform_uuid = runner.run(kPlatformUuidCommand, 40);
+  if (facts.platform_uuid.empty()) facts.platform_uuid = stringAt(hardware, "platform_UUID");
+  if (hardware) {
+    const PlistValue* packages = hardware->find("packages");
+    if (packages && packages->kind == PlistValue::Kind::kInteger) {
+      facts.package_count = std::to_string(static_cast<unsigned>(packages->integer));
+    }
+  }
+  facts.processor_count = integerText(hardware, "number_processors");
+  std::string speed = stringAt(hardware, "current_processor_speed");
+  if (!speed.empty()) {
+    double number = std::atof(firstWord(speed).c_str());
+    // Old profilers print "2.26 GHz", very old ones "867 MHz".
+    facts.processor_speed = wholeNumber(speed.find("MHz") != std::string::npos ? number
+                                                                                : number * 1000);
+  }
+  facts.processor_model = stringAt(hardware, "cpu_type");
+  if (facts.processor_model.find("Intel") != std::string::npos) facts.processor_maker = "GenuineIntel";
+  facts.machine_model = stringAt(hardware, "machine_model");
+  facts.system_maker = "Apple Inc.";
+  std::string memory = stringAt(hardware, "physical_memory");
+  if (!memory.empty()) facts.physical_memory = wholeNumber(SizeText::toKilobytes(memory) / 1024.0);
+
+  readDisplays(root, &facts);
+  readDisks(root, &facts);
+  return facts;
+}
+
+std::string readSerialNumber(const PlistValue& root) {
+  return stringAt(firstItem(root, "SPHardwareDataType"), "serial_number");
+}
+
+}  // namespace cvn

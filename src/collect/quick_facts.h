@@ -1,0 +1,61 @@
+// The handful of facts the snapshot header and the asset summary need as
+// ready-made texts, read straight from the parsed profiler list.
+#ifndef CVN_COLLECT_QUICK_FACTS_H_
+#define CVN_COLLECT_QUICK_FACTS_H_
+
+#include <string>
+#include <string_view>
+
+#include "collect/plist.h"
+
+namespace cvn {
+
+class CommandRunner;
+
+/// Every field is empty when its key is missing.
+struct QuickFacts {
+  std::string local_host_name;
+  /// The short account name: what "user_name" holds between "(" and ")".
+  std::string user_name;
+  std::string platform_uuid;
+  std::string os_version;
+  /// Processor packages ("packages"), "%u".
+  std::string package_count;
+  /// Cores ("number_processors").
+  std::string processor_count;
+  /// Clock speed in MHz, a whole number.
+  std::string processor_speed;
+  std::string processor_model;
+  std::string processor_maker;
+  std::string machine_model;
+  std::string system_maker;
+  /// Megabytes, a whole number.
+  std::string physical_memory;
+  /// Megabytes, a whole number.
+  std::string video_memory;
+  std::string main_display_resolution;
+  /// The main display's diagonal in inches, from its EDID.
+  std::string main_display_size;
+  /// Gigabytes with one decimal: the serial-ATA disks' total size, their
+  /// volumes' total size and the volumes' total free space.
+  std::string disk_capacity;
+  std::string volume_capacity;
+  std::string volume_free;
+};
+
+/// The "_items" array of the first dictionary whose "_dataType" is
+/// `data_type`; null when there is none.
+const PlistValue* findProfilerItems(const PlistValue& root, std::string_view data_type);
+
+/// `runner` asks ioreg for the platform UUID first.
+QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner);
+
+/// The first hardware item's "serial_number"; empty when missing.
+std::string readSerialNumber(const PlistValue& root);
+
+/// The command whose output is the platform UUID.
+extern const char kPlatformUuidCommand[];
+
+}  // namespace cvn
+
+#endif  // CVN_COLLECT_QUICK_FACTS_H_
