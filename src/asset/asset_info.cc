@@ -59,7 +59,7 @@ void writeDiskEntries(TagTree& tree, const TagTree& snapshot) {
     std::snprintf(path, sizeof path, "/control/disk:%d", position);
     TagProperty& entry = tree.setValue(path, free->value());
     const Annotation* base = free->findAnnotation("base-value");
-    entry.addAnnotation("free", base ? base->text : std::string());
+    if (base) entry.addAnnotation("free", base->text);
     const TagProperty* used = disk->findProperty("used%");
     if (used && used->value().isInt()) {
       entry.addAnnotation("free%", std::to_string(100 - used->value().asInt()));

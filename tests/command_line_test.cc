@@ -1,0 +1,108 @@
+#include "main/command_line.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <string>
+
+namespace cvn {
+namespace {
+
+struct ParseCase {
+  std::vector<std::string> args;
+  CommandLineAction action;
+  bool silent, debug, log;
+  std::string ip, login;
+  int silenced;  // how often the redirection ran
+};
+
+TEST(CommandLineTest, OptionsAreMatchedExactlyInOrder) {
+  const ParseCase cases[] = {
+      {{}, CommandLineAction::kScan, false, false, false, "", "", 0},
+      {{"-silent", "-log", "-debug"}, CommandLineAction::kScan, true, true, true, "", "", 1},
+      {{"/silent", "/log", "/debug"}, CommandLineAction::kScan, true, true, true, "", "", 1},
+      // Case matters and unknown options are ignored without a word.
+      {{"-LOG", "-Silent", "--debug", "x"}, CommandLineAction::kScan, false, false, false, "", "",
+       0},
+      {{"-ip:10.0.0.1", "/ip:10.0.0.2"}, CommandLineAction::kScan, false, false, false,
+       "10.0.0.2", "", 0},
+      {{"-ip:"}, CommandLineAction::kScan, false, false, false, "", "", 0},
+      // Only the first colon separates; "-log" never swallows "-login:".
+      {{"-login:a:b", "-log"}, CommandLineAction::kScan, false, false, true, "", "a:b", 0},
+      {{"/login:"}, CommandLineAction::kScan, false, false, false, "", "", 0},
+      // Help stops parsing; what came before has taken effect.
+      {{"-silent", "-?", "-log"}, CommandLineAction::kHelp, true, false, false, "", "", 1},
+      {{"--help", "-silent"}, CommandLineAction::kHelp, false, false, false, "", "", 0},
+  };
+  for (const ParseCase& c : cases) {
+    ScanSettings s;
+    int silenced = 0;
+    CommandLineAction action = parseCommandLine(c.args, &s, [&] { ++silenced; });
+    std::string where = c.args.empty() ? "(none)" : c.args.front();
+    EXPECT_EQ(action, c.action) << where;
+    EXPECT_EQ(s.silent, c.silent) << where;
+    EXPECT_EQ(s.debug, c.debug) << where;
+    EXPECT_EQ(s.log, c.log) << where;
+    EXPECT_EQ(s.ip, c.ip) << where;
+    EXPECT_EQ(s.login, c.login) << where;
+    EXPECT_EQ(silenced, c.silenced) << where;
+  }
+}
+
+std::string consent(const std::string& input, ConsentAnswer* answer) {
+  std::FILE* in = tmpfile();
+  std::FILE* out = tmpfile();
+  std::fwrite(input.data(), 1, input.size(), in);
+  std::rewind(in);
+  *answer = askConsent(in, out);
+  std::rewind(out);
+  std::string text;
+  char buf[256];
+  size_t n;
+  while ((n = std::fread(buf, 1, sizeof buf, out)) > 0) text.append(buf, n);
+  std::fclose(in);
+  std::fclose(out);
+  return text;
+}
+
+TEST(CommandLineTest, ConsentAcceptsOnlyLowerCaseYAndN) {
+  const std::string prompt =
+      "Corvane scanner for MacOS X\nDo you want to start the scan of local computer?(y/n)\n";
+  const struct {
+    std::string input;
+    ConsentAnswer answer;
+    std::string line;
+  } cases[] = {
+      {"y\n", ConsentAnswer::kYes, "Scan started...\n"},
+      {"  y  trailing words\n", ConsentAnswer::kYes, "Scan started...\n"},
+      {"n\n", ConsentAnswer::kNo, "Scan canceled.\n"},
+      {"Y\n", ConsentAnswer::kInvalid, "Incorrect input. Application terminated.\n"},
+      {"yes\n", ConsentAnswer::kInvalid, "Incorrect input. Application terminated.\n"},
+      {"", ConsentAnswer::kInvalid, "Incorrect input. Application terminated.\n"},
+      {std::string(500, 'y'), ConsentAnswer::kInvalid,
+       "Incorrect input. Application terminated.\n"},
+  };
+  for (const auto& c : cases) {
+    ConsentAnswer answer;
+    EXPECT_EQ(consent(c.input, &answer), prompt + c.line) << c.input.substr(0, 20);
+    EXPECT_EQ(answer, c.answer) << c.input.substr(0, 20);
+  }
+}
+
+TEST(CommandLineTest, HelpOmitsTheHiddenOptions) {
+  std::FILE* out = tmpfile();
+  printHelp(out);
+  std::rewind(out);
+  std::string text(4096, '\0');
+  text.resize(std::fread(&text[0], 1, text.size(), out));
+  std::fclose(out);
+  EXPECT_NE(text.find("Corvane's Mac OS X Agent\nUsage: cvnmacagent [OPTION...]\n"
+                      "-ip:[ipaddr],\t\t/ip:[ipaddr]\t\tSet Current IP Address\n"
+                      "--help,\t\t\t-?\t\t\tShow this help message\n"),
+            std::string::npos);
+  EXPECT_NE(text.find("\n\n\nFor additional information contact us: "), std::string::npos);
+  EXPECT_EQ(text.find("-log"), std::string::npos);
+}
+
+}  // namespace
+}  // namespace cvn

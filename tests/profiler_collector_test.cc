@@ -1,0 +1,113 @@
+#include "collect/profiler_collector.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <string>
+
+#include "fake_command_runner.h"
+
+namespace cvn {
+namespace {
+
+const char* const kTypes[] = {
+    "SPHardwareDataType",      "SPNetworkDataType",       "SPSoftwareDataType",
+    "SPParallelATADataType",   "SPAudioDataType",         "SPBluetoothDataType",
+    "SPFireWireDataType",      "SPDisplaysDataType",      "SPMemoryDataType",
+    "SPPrintersDataType",      "SPSerialATADataType",     "SPParallelSCSIDataType",
+    "SPUSBDataType",           "SPAirPortDataType",       "SPFirewallDataType",
+    "SPNetworkLocationDataType", "SPNetworkVolumeDataType", "SPApplicationsDataType",
+    "SPStartupItemDataType",   "SPDiscBurningDataType",   "SPPowerDataType"};
+
+std::string command(const std::string& type) {
+  return "system_profiler -detailLevel full -xml " + type;
+}
+
+std::string body(const std::string& type) { return "<dict>" + type + "</dict>\n"; }
+
+std::string output(const std::string& type) {
+  return std::string(kProfilerHeader) + body(type) + std::string(kProfilerFooter);
+}
+
+// Counts calls and answers nothing for the first few.
+class SlowRunner : public FakeCommandRunner {
+ public:
+  int silent_calls = 3;
+  std::string run(const std::string& cmd, size_t chunk) override {
+    std::string out = FakeCommandRunner::run(cmd, chunk);
+    return silent_calls-- > 0 ? std::string() : out;
+  }
+};
+
+TEST(ProfilerCollectorTest, SplicesEveryTypeInOrderWithOneHeaderAndFooter) {
+  FakeCommandRunner runner;
+  std::string expected(kProfilerHeader);
+  for (const char* type : kTypes) {
+    runner.answer(command(type), output(type));
+    expected += body(type);
+  }
+  expected += kProfilerFooter;
+  std::FILE* out = tmpfile();
+  std::string document = ProfilerCollector(runner).collect(false, out);
+  EXPECT_EQ(document, expected);
+  EXPECT_EQ(std::ftell(out), 0) << "nothing is printed without the progress flag";
+  std::fclose(out);
+  ASSERT_EQ(runner.commands_ran_.size(), 21u);
+  for (size_t i = 0; i < 21; ++i) {
+    EXPECT_EQ(runner.commands_ran_[i], command(kTypes[i]));
+    EXPECT_EQ(runner.chunk_sizes_[i], 65536u);
+  }
+}
+
+TEST(ProfilerCollectorTest, ShortOutputsDropOutButHeaderAndFooterStay) {
+  FakeCommandRunner runner;
+  for (const char* type : kTypes) runner.answer(command(type), output(type));
+  // 17 bytes is too short for the first cut, 189 for the middle, 171 for the last.
+  runner.answer(command("SPHardwareDataType"), std::string(17, 'x'));
+  runner.answer(command("SPAudioDataType"), std::string(189, 'x'));
+  runner.answer(command("SPPowerDataType"), std::string(171, 'x'));
+  std::string document = ProfilerCollector(runner).collect(false, nullptr);
+  EXPECT_EQ(document.compare(0, kProfilerHeader.size(), kProfilerHeader), 0);
+  EXPECT_EQ(document.substr(document.size() - kProfilerFooter.size()), kProfilerFooter);
+  EXPECT_EQ(document.find("SPAudioDataType"), std::string::npos);
+  EXPECT_EQ(document.find("SPHardwareDataType"), std::string::npos);
+  EXPECT_LT(document.find("SPBluetoothDataType"), document.find("SPDisplaysDataType"));
+}
+
+TEST(ProfilerCollectorTest, TrimModesCutByByteCount) {
+  FakeCommandRunner runner;
+  runner.answer(command("A"), output("A"));
+  ProfilerCollector collector(runner);
+  EXPECT_EQ(collector.runProfiler("A", ProfilerCollector::Trim::kFirst),
+            std::string(kProfilerHeader) + body("A"));
+  EXPECT_EQ(collector.runProfiler("A", ProfilerCollector::Trim::kMiddle), body("A"));
+  EXPECT_EQ(collector.runProfiler("A", ProfilerCollector::Trim::kLast),
+            body("A") + std::string(kProfilerFooter));
+  runner.answer(command("B"), std::string(190, 'x'));
+  EXPECT_EQ(collector.runProfiler("B", ProfilerCollector::Trim::kMiddle), "");
+  runner.answer(command("B"), std::string(191, 'x'));
+  EXPECT_EQ(collector.runProfiler("B", ProfilerCollector::Trim::kMiddle), "x");
+}
+
+TEST(ProfilerCollectorTest, ATypeThatPrintsNothingIsAskedAgain) {
+  SlowRunner runner;
+  runner.answer(command("A"), output("A"));
+  EXPECT_EQ(ProfilerCollector(runner).runProfiler("A", ProfilerCollector::Trim::kMiddle),
+            body("A"));
+  EXPECT_EQ(runner.commands_ran_.size(), 4u);
+}
+
+TEST(ProfilerCollectorTest, ProgressLinesFollowTheirSteps) {
+  FakeCommandRunner runner;
+  for (const char* type : kTypes) runner.answer(command(type), output(type));
+  std::FILE* out = tmpfile();
+  ProfilerCollector(runner).collect(true, out);
+  std::rewind(out);
+  char buf[256] = {0};
+  size_t n = std::fread(buf, 1, sizeof buf - 1, out);
+  std::fclose(out);
+  EXPECT_EQ(std::string(buf, n), "10%\n20%\n30%\n40%\n50%\n60%\n70%\n80%\n90%\n100%\n");
+}
+
+}  // namespace
+}  // namespace cvn
