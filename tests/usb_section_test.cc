@@ -332,6 +332,26 @@ partitions=0
 )");
 }
 
+// Real trees nest a handful of hubs; a damaged one may nest without end.
+TEST(UsbSectionTest, WalksNestedHubsUpToABound) {
+  TagTree raw(true, "Macintosh");
+  std::string path = kBus0;
+  for (int depth = 0; depth < 200; ++depth) {
+    if (depth == 5) raw.setValue(path + "item1/_name", TagValue("Keyboard"));
+    path += "item0/_items/";
+  }
+  raw.setValue(path + "item0/_name", TagValue("Too deep"));
+  TagTree snapshot(true, "Snapshot");
+  FakeCommandRunner runner;
+  buildUsbSection(snapshot, raw, runner);
+  EXPECT_EQ(treeText(snapshot.top().findChild("Peripherals")), R"(+Peripherals=
++USB=
+*Device:1="Keyboard"
+-
+-
+)");
+}
+
 TEST(UsbSectionTest, MissingDataTypeOrBusesWriteNothing) {
   FakeCommandRunner runner;
   TagTree raw(true, "Macintosh");

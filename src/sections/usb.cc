@@ -17,6 +17,9 @@ namespace {
 constexpr size_t kDiskutilChunkSize = 200;
 constexpr std::string_view kMediaNameLabel = "Device / Media Name:";
 constexpr std::string_view kMediaNameEnd = " Media\n";
+// USB allows seven tiers of hubs; anything deeper is a damaged tree, and
+// walking it must not exhaust the stack.
+constexpr int kMaxHubDepth = 32;
 
 constexpr std::string_view kDescriptorKeys[] = {"product_id", "vendor_id",     "bcd_device",
                                                 "serial_num", "device_speed",  "manufacturer",
@@ -49,14 +52,16 @@ class UsbWriter {
  public:
   UsbWriter(Tag& top, CommandRunner& runner) : top_(top), runner_(runner) {}
 
-  void addDevice(const Tag& device) {
+  void addDevice(const Tag& device, int depth = 0) {
     const TagValue* removable = rawValue(device, "removable_media");
     if (removable && removable->isText() && removable->text() == "yes") {
       addRemovable(device);
       return;
     }
     if (const Tag* children = device.findChild("_items")) {
-      for (const auto& child : children->children()) addDevice(*child);
+      if (depth < kMaxHubDepth) {
+        for (const auto& child : children->children()) addDevice(*child, depth + 1);
+      }
       return;
     }
     addPeripheral(device);
