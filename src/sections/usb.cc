@@ -1,0 +1,199 @@
+// USB devices: removable storage joins the disks under "Storage" (asking
+// diskutil for its media name), every other device goes under
+// "Peripherals"/"USB". Hubs are walked through, not recorded.
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include "collect/command_runner.h"
+#include "sections/builder_util.h"
+#include "sections/sections.h"
+#include "sections/volume_fields.h"
+#include "zxml/size_text.h"
+
+namespace cvn {
+namespace {
+
+constexpr size_t kDiskutilChunkSize = 200;
+constexpr std::string_view kMediaNameLabel = "Device / Media Name:";
+constexpr std::string_view kMediaNameEnd = " Media\n";
+// USB allows seven tiers of hubs; anything deeper is a damaged tree, and
+// walking it must not exhaust the stack.
+constexpr int kMaxHubDepth = 32;
+
+constexpr std::string_view kDescriptorKeys[] = {"product_id", "vendor_id",     "bcd_device",
+                                                "serial_num", "device_speed",  "manufacturer",
+                                                "bus_power",  "bus_power_used"};
+
+// The profilers of 10.5 and 10.6 sort the USB descriptor keys by a letter
+// prefix ("a_product_id", "h_bus_power"); behind it is the key that later
+// profilers write plainly.
+std::string_view descriptorKey(std::string_view key) {
+  if (key.size() > 2 && key[0] >= 'a' && key[0] <= 'z' && key[1] == '_') {
+    std::string_view rest = key.substr(2);
+    for (std::string_view known : kDescriptorKeys) {
+      if (rest == known) return rest;
+    }
+  }
+  return key;
+}
+
+// The media name sits between the label and " Media" at the end of its line.
+std::optional<std::string> findMediaName(const std::string& diskutil_output) {
+  size_t label = diskutil_output.find(kMediaNameLabel);
+  if (label == std::string::npos) return std::nullopt;
+  size_t start = label + kMediaNameLabel.size();
+  size_t end = diskutil_output.find(kMediaNameEnd, start);
+  if (end == std::string::npos) return std::nullopt;
+  return trimText(std::string_view(diskutil_output).substr(start, end - start), " \n\r", kTrimBoth);
+}
+
+class UsbWriter {
+ public:
+  UsbWriter(Tag& top, CommandRunner& runner) : top_(top), runner_(runner) {}
+
+  void addDevice(const Tag& device, int depth = 0) {
+    const TagValue* removable = rawValue(device, "removable_media");
+    if (removable && removable->isText() && removable->text() == "yes") {
+      addRemovable(device);
+      return;
+    }
+    if (const Tag* children = device.findChild("_items")) {
+      if (depth < kMaxHubDepth) {
+        for (const auto& child : children->children()) addDevice(*child, depth + 1);
+      }
+      return;
+    }
+    addPeripheral(device);
+  }
+
+ private:
+  void addPeripheral(const Tag& device) {
+    Tag& record = top_.addChild("Peripherals")
+                      .addChild("USB")
+                      .addChild(formatText("Device:%d", devices_ + 1));
+    if (const TagValue* name = rawValue(device, "_name")) record.setValue(*name);
+    for (const auto& prop : device.properties()) {
+      std::string_view key = descriptorKey(prop->name());
+      const TagValue& value = prop->value();
+      if (key == "product_id") {
+        record.setProperty("product-id", value);
+      } else if (key == "vendor_id") {
+        record.setProperty("vendor-id", value);
+      } else if (key == "bcd_device") {
+        record.setProperty("bcd-device", value);
+      } else if (key == "serial_num") {
+        record.setProperty("serial-number", value);
+      } else if (key == "device_speed") {
+        // Megabits per second; speeds without a known rate are left out.
+        const std::string& speed = value.text();
+        if (speed == "full_speed") {
+          record.setProperty("device-speed", TagValue("12"));
+        } else if (speed == "low_speed") {
+          record.setProperty("device-speed", TagValue("1.5"));
+        } else if (speed == "high_speed") {
+          record.setProperty("device-speed", TagValue("480"));
+        }
+      } else if (key == "manufacturer") {
+        record.setProperty("manuf", value);
+      } else if (key == "bus_power") {
+        record.setProperty("bus-power", value);
+      } else if (key == "bus_power_used") {
+        record.setProperty("bus-power-used", value);
+      }
+    }
+    ++devices_;
+  }
+
+  void addRemovable(const Tag& device) {
+    Tag& physical = top_.addChild("Storage").addChild("Physical-disks");
+    Tag& disk = physical.addChild(physical.nextNumberedName("Removable:"));
+    if (const TagValue* name = rawValue(device, "_name")) disk.setValue(*name);
+    disk.setProperty("media-type", TagValue("2"));
+    for (const auto& prop : device.properties()) {
+      std::string_view key = descriptorKey(prop->name());
+      const TagValue& value = prop->value();
+      if (key == "bcd_device") {
+        disk.setProperty("bcd-device", value);
+      } else if (key == "serial_num") {
+        disk.setProperty("serial", value);
+      } else if (key == "device_speed") {
+        const std::string& speed = value.text();
+        const char* code = speed == "full_speed" ? "1" : speed == "low_speed" ? "0" : "2";
+        disk.setProperty("device-speed", TagValue(code));
+      } else if (key == "manufacturer") {
+        disk.setProperty("manufacturer", value);
+      } else if (key == "bus_power") {
+        disk.setProperty("bus-power", value);
+      } else if (key == "bus_power_used") {
+        disk.setProperty("bus-power-used", value);
+      } else if (key == "size") {
+        writeRemovableSize(disk, device, value);
+      } else if (key == "bsd_name") {
+        writeMediaName(disk, value.text());
+      }
+    }
+    disk.setProperty("interface", TagValue("USB"));
+    int64_t partitions = 0;
+    if (const Tag* volumes = device.findChild("volumes")) {
+      for (const auto& volume : volumes->children()) {
+        if (addVolume(*volume)) ++partitions;
+      }
+    }
+    disk.setProperty("partitions", TagValue(partitions));
+  }
+
+  static void writeRemovableSize(Tag& disk, const Tag& device, const TagValue& size) {
+    double gigabytes = SizeText::toDecimalGigabytes(size.text(), true);
+    TagValue whole(truncateToInt64(gigabytes));
+    if (const TagValue* bytes = rawValue(device, "size_in_bytes")) {
+      std::string base = formatText("%lld", static_cast<long long>(rawBytes(*bytes)));
+      disk.setProperty("size", whole, "base-value", base.c_str());
+    } else {
+      disk.setProperty("size", whole);
+    }
+  }
+
+  void writeMediaName(Tag& disk, const std::string& bsd_name) {
+    // No name, nothing to ask diskutil about.
+    if (bsd_name.empty()) return;
+    std::string output =
+        runner_.run("diskutil info " + shellQuote("/dev/" + bsd_name), kDiskutilChunkSize);
+    if (std::optional<std::string> media = findMediaName(output)) {
+      disk.setProperty("model", TagValue(*media));
+    }
+  }
+
+  // Volumes the profiler lists without free space (not mounted) are left out.
+  bool addVolume(const Tag& volume) {
+    if (!hasKey(volume, "_name") || !hasKey(volume, "free_space")) return false;
+    Tag& logical = top_.addChild("Storage").addChild("Logical-disks");
+    Tag& partition = logical.setChildValue(logical.nextNumberedName("partition:"),
+                                           TagValue(rawText(volume, "_name")));
+    writeFileSystem(partition, volume);
+    copyFieldIfPresent(partition, "bsd-name", volume, "bsd_name");
+    copyFieldIfPresent(partition, "mount-point", volume, "mount_point");
+    VolumeSpace space = writeVolumeSpace(partition, volume);
+    writeUsedPercent(partition, space);
+    return true;
+  }
+
+  Tag& top_;
+  CommandRunner& runner_;
+  int devices_ = 0;
+};
+
+}  // namespace
+
+void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner) {
+  const Tag* buses = findItems(raw, "SPUSBDataType");
+  if (!buses) return;
+  UsbWriter writer(snapshot.top(), runner);
+  for (const auto& bus : buses->children()) {
+    const Tag* devices = bus->findChild("_items");
+    if (!devices) continue;
+    for (const auto& device : devices->children()) writer.addDevice(*device);
+  }
+}
+
+}  // namespace cvn

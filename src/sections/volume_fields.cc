@@ -1,0 +1,86 @@
+#include "sections/volume_fields.h"
+
+#include <string>
+#include <string_view>
+
+#include "sections/builder_util.h"
+#include "zxml/size_text.h"
+
+namespace cvn {
+namespace {
+
+struct SizeReading {
+  double gigabytes = 0.0;
+  int64_t bytes = 0;
+};
+
+// Only an integer byte count is trusted; otherwise the profiler's own size
+// text is converted, keeping its fraction.
+SizeReading readVolumeSize(const Tag& volume, std::string_view bytes_key,
+                           std::string_view text_key) {
+  SizeReading reading;
+  const TagValue* bytes = rawValue(volume, bytes_key);
+  if (bytes && bytes->isInt()) {
+    reading.bytes = bytes->asInt();
+    reading.gigabytes = bytesToDecimalGigabytes(reading.bytes);
+  } else {
+    std::string text = rawText(volume, text_key);
+    reading.gigabytes = SizeText::toDecimalGigabytes(text, false);
+    reading.bytes = SizeText::toBytes(text);
+  }
+  return reading;
+}
+
+void writeSize(Tag& partition, std::string_view field, const SizeReading& reading) {
+  std::string base = formatText("%lld", static_cast<long long>(reading.bytes));
+  partition.setProperty(field, TagValue(reading.gigabytes), "base-value", base.c_str());
+}
+
+}  // namespace
+
+int64_t truncateToInt64(double value) {
+  // Both bounds are exact doubles; NaN fails the test and gives 0.
+  if (!(value >= -9223372036854775808.0 && value < 9223372036854775808.0)) return 0;
+  return static_cast<int64_t>(value);
+}
+
+double bytesToDecimalGigabytes(int64_t bytes) {
+  return static_cast<double>(bytes) / 1000 / 10000000 * 10;
+}
+
+int64_t rawBytes(const TagValue& value) { return value.isInt() ? value.asInt() : 0; }
+
+void writeFileSystem(Tag& partition, const Tag& volume) {
+  if (hasKey(volume, "file_system")) {
+    partition.setProperty("file-sys", TagValue(rawText(volume, "file_system")));
+  }
+}
+
+VolumeSpace writeVolumeSpace(Tag& partition, const Tag& volume) {
+  VolumeSpace space;
+  if (hasKey(volume, "size")) {
+    SizeReading total = readVolumeSize(volume, "size_in_bytes", "size");
+    space.total_gb = total.gigabytes;
+    writeSize(partition, "size", total);
+  }
+  if (hasKey(volume, "free_space")) {
+    SizeReading free = readVolumeSize(volume, "free_space_in_bytes", "free_space");
+    space.free_known = true;
+    space.free_gb = free.gigabytes;
+    writeSize(partition, "free", free);
+  }
+  return space;
+}
+
+void writeUsedPercent(Tag& partition, const VolumeSpace& space) {
+  if (!space.free_known || space.total_gb == 0.0) return;
+  double used = space.total_gb - space.free_gb;
+  double percent = used / space.total_gb * 100;
+  if (!(percent > -9.2e18 && percent < 9.2e18)) return;
+  TagProperty& prop = partition.setProperty("used%", TagValue(truncateToInt64(percent)), "pos",
+                                            formatText("%.2lf", used).c_str());
+  prop.addAnnotation("max", formatText("%.2lf", space.total_gb));
+  prop.addAnnotation("val-units", "GB");
+}
+
+}  // namespace cvn
