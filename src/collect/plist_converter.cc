@@ -3,6 +3,7 @@
 #include <cinttypes>
 #include <cstdio>
 #include <deque>
+#include <vector>
 
 #include "zxml/date_text.h"
 
@@ -61,6 +62,8 @@ struct PlistConverter::Node {
   std::string name;
   // Set once created; from then on a branch, as a path step leaves it.
   Tag* tag = nullptr;
+  // Root nodes only: the document the paths are read from.
+  Tag* document = nullptr;
 
   Tag& create() {
     if (!tag) tag = &parent->create().addChild(name);
@@ -73,14 +76,39 @@ struct PlistConverter::Node {
       tag->setProperty(key, value);
       return;
     }
-    // The first leaf goes through the path setter one step up, which turns
-    // this tag into a branch just as a path from the top would.
-    Tag& above = parent->create();
-    std::string step = name;
-    step += '/';
-    step += key;
-    above.setPropertyByPath(step, value);
-    tag = above.findChild(name);
+    if (!name.empty()) {
+      // The first leaf goes through the path setter one step up, which turns
+      // this tag into a branch just as a path from the top would.
+      Tag& above = parent->create();
+      std::string step = name;
+      step += '/';
+      step += key;
+      above.setPropertyByPath(step, value);
+      tag = above.findChild(name);
+      return;
+    }
+    storeByFullPath(key, value);
+  }
+
+  // An empty name would read as a leading "/" one step up, so such a node
+  // takes the whole path from the document (rare: empty keys or data types).
+  void storeByFullPath(std::string_view key, const TagValue& value) {
+    std::vector<Node*> chain;
+    Node* root = this;
+    for (; root->parent; root = root->parent) chain.push_back(root);
+    std::string path = root->tag == root->document ? "" : "/";
+    for (auto it = chain.rbegin(); it != chain.rend(); ++it) {
+      if (it != chain.rbegin()) path += '/';
+      path += (*it)->name;
+    }
+    path += '/';
+    path += key;
+    root->document->setPropertyByPath(path, value);
+    Tag* current = root->tag;
+    for (auto it = chain.rbegin(); it != chain.rend(); ++it) {
+      current = current->findChild((*it)->name);
+      (*it)->tag = current;
+    }
   }
 };
 
@@ -109,6 +137,7 @@ void PlistConverter::chainFor(std::string_view path, std::deque<Node>& chain) {
   // As TagTree::setValue reads "<path>/<key>": a leading "/" starts at the
   // top tag, and every segment after it (empty ones too) is a tag.
   Node root;
+  root.document = &tree_.document();
   root.tag = &tree_.top();
   if (!path.empty() && path.front() != '/') root.tag = &tree_.document();
   chain.push_back(std::move(root));
