@@ -38,8 +38,7 @@ int runAgent(int argc, char** argv) {
   output.progress_log = settings.log ? 1 : 0;
 
   std::unique_ptr<ProcessTable> processes = makeSystemProcessTable();
-  std::unique_ptr<FileSystem> files = makeSystemFileSystem();
-  ScanDriver driver(ScanTools{systemCommandRunner(), *processes, *files, readComputerName,
+  ScanDriver driver(ScanTools{systemCommandRunner(), *processes, systemFileSystem(), readComputerName,
                               stdout, stderr});
   driver.run(output, settings.silent, settings.debug, settings.ip, settings.login);
   std::fflush(stdout);
