@@ -127,13 +127,13 @@ v-mode:1="1920 x 1200 (16:10)"
 TEST(DisplaysSectionTest, MonitorsCountAcrossAdaptersAndSkipEmptyConnectors) {
   TagTree raw(true, "Macintosh");
   setRaw(raw, "item0/sppci_model", "Intel HD Graphics 3000");
-  setRaw(raw, "item0/spdisplays_vram_shared", "1,5 GB");
+  setRaw(raw, "item0/spdisplays_vram_shared", "1,5 GB of Shared System Memory");
   setRaw(raw, "item0/spdisplays_ndrvs/item0/_name", "Color LCD");
   setRaw(raw, "item0/spdisplays_ndrvs/item0/spdisplays_resolution", "1440 x 900");
   setRaw(raw, "item0/spdisplays_ndrvs/item0/spdisplays_main", "spdisplays_yes");
   setRaw(raw, "item0/spdisplays_ndrvs/item0/_spdisplays_edid", "0x00ffffffffffff00");
   setRaw(raw, "item1/sppci_model", "NVIDIA GeForce 9400");
-  setRaw(raw, "item1/spdisplays_vram", 256);
+  setRaw(raw, "item1/spdisplays_vram", 256);  // not text: no size
   setRaw(raw, "item1/spdisplays_ndrvs/item0/_name", "spdisplays_display_connector");
   setRaw(raw, "item1/spdisplays_ndrvs/item0/spdisplays_status", "spdisplays_not_connected");
   setRaw(raw, "item1/spdisplays_ndrvs/item1/_name", "W2261");

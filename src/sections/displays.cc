@@ -18,9 +18,15 @@ void writeVideoMemory(Tag& adapter, const Tag& item) {
   const char* key = hasKey(item, "spdisplays_vram") ? "spdisplays_vram" : "spdisplays_vram_shared";
   const TagValue* value = rawValue(item, key);
   if (!value || !value->isText()) return;
-  const std::string& text = value->text();
-  std::string bytes = formatText("%lld", static_cast<long long>(SizeText::toBytes(text)));
-  adapter.setProperty("video-memory", TagValue(sizeInMegabytes(text)), "base-value", bytes.c_str());
+  // Shared memory reads "64 MB of Shared System Memory"; the size is the
+  // number and unit in front.
+  std::string_view text = value->text();
+  size_t blank = text.find(' ');
+  if (blank != std::string_view::npos) text = text.substr(0, text.find(' ', blank + 1));
+  int64_t bytes = SizeText::toBytes(text);
+  if (bytes <= 0) return;
+  adapter.setProperty("video-memory", TagValue(sizeInMegabytes(text)), "base-value",
+                      formatText("%lld", static_cast<long long>(bytes)).c_str());
 }
 
 void writeAdapter(Tag& adapter, const Tag& item) {
