@@ -1,7 +1,6 @@
 #include "sections/edid.h"
 
 #include <cmath>
-#include <cstdlib>
 
 #include "sections/builder_util.h"
 
