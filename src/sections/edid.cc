@@ -41,7 +41,10 @@ struct StandardTiming {
 
 // The aspect code 00 always means 16:10 here, whatever the EDID version.
 bool readStandardTiming(uint8_t first, uint8_t second, StandardTiming* timing) {
-  if (first == 1 || second == 1) return false;
+  // Either byte 1 marks an unused pair (the standard asks for both). A first
+  // byte of 0 names no mode at all: a block whose timing bytes are all zero
+  // must give no resolution rather than an invented 248 x 150.
+  if (first == 0 || first == 1 || second == 1) return false;
   int x = first * 8 + 248;
   switch (second >> 6) {
     case 0:
