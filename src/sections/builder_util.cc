@@ -61,7 +61,7 @@ std::string flagText(std::string_view text, std::string_view yes) {
 int64_t truncateToInt64(double value) {
   // 2^63 is exact as a double; NaN fails both comparisons.
   constexpr double kLimit = 9223372036854775808.0;
-  if (!(value > -kLimit && value < kLimit)) return 0;
+  if (!(value >= -kLimit && value < kLimit)) return 0;
   return static_cast<int64_t>(value);
 }
 

@@ -131,6 +131,7 @@ int64_t uptimeSeconds(std::string_view uptime) {
 }
 
 std::string formatDmtfInterval(int64_t seconds) {
+  if (seconds < 0) seconds = 0;
   long long days = seconds / 86400;
   int rest = static_cast<int>(seconds % 86400);
   return formatText("%08lld%02d%02d%02d.000000:000", days, rest / 3600, rest % 3600 / 60,

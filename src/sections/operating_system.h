@@ -47,7 +47,8 @@ OsVersionText parseOsVersion(std::string_view os_version);
 /// beyond its ninth from the right.
 int64_t uptimeSeconds(std::string_view uptime);
 
-/// Seconds as a DMTF interval: "%08lld%02d%02d%02d.000000:000".
+/// Seconds as a DMTF interval: "%08lld%02d%02d%02d.000000:000" (days, hours,
+/// minutes, seconds); a negative count is written as 0.
 std::string formatDmtfInterval(int64_t seconds);
 
 }  // namespace cvn
