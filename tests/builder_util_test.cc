@@ -12,16 +12,24 @@ TEST(BuilderUtilTest, SizeInMegabytesAtItsBoundaries) {
   struct Case {
     const char* text;
     int64_t megabytes;
+    const char* why;
   };
   const Case cases[] = {
-      {"4 GB", 4096},     {"1,5 GB", 1536}, {"1023 KB", 0},  // just under a megabyte truncates to
-                                                             // nothing
-      {"1024 KB", 1},     {"512 MB", 512},  {"2 TB", 2048000},  // a terabyte counts 1000 gigabytes
-      {"3.999 GB", 4094}, {"4 gb", 0},      {"", 0},           {"nan GB", 0},
-      {"inf GB", 0},      {"1e300 TB", 0},  // far beyond float: must not even be narrowed
-      {"9e15 GB", 0},                       // beyond int64 as megabytes
+      {"4 GB", 4096, "plain"},
+      {"1,5 GB", 1536, "decimal comma"},
+      {"1023 KB", 0, "just under a megabyte"},
+      {"1024 KB", 1, "one megabyte"},
+      {"2 TB", 2048000, "a terabyte counts 1000 gigabytes"},
+      {"3.999 GB", 4094, "truncated, not rounded"},
+      {"4 gb", 0, "units are case-sensitive"},
+      {"", 0, "missing"},
+      {"nan GB", 0, "not a number"},
+      {"inf GB", 0, "infinite"},
+      {"1e300 TB", 0, "beyond float: must not even be narrowed"},
+      {"9e15 GB", 0, "beyond int64 as megabytes"},
   };
-  for (const Case& c : cases) EXPECT_EQ(sizeInMegabytes(c.text), c.megabytes) << c.text;
+  for (const Case& c : cases)
+    EXPECT_EQ(sizeInMegabytes(c.text), c.megabytes) << c.text << ": " << c.why;
 }
 
 TEST(BuilderUtilTest, TruncateToInt64GuardsTheRange) {
