@@ -17,6 +17,21 @@ const Tag* findFirstItem(const TagTree& raw, std::string_view data_type) {
   return items ? items->firstChild() : nullptr;
 }
 
+size_t itemPosition(const Tag& item, size_t index) {
+  std::string_view name = item.name();
+  constexpr std::string_view kPrefix = "item";
+  if (name.size() <= kPrefix.size() || name.substr(0, kPrefix.size()) != kPrefix) return index;
+  std::string_view digits = name.substr(kPrefix.size());
+  // Nine digits keep the arithmetic far from overflow; no array is that long.
+  if (digits.size() > 9) return index;
+  size_t position = 0;
+  for (char c : digits) {
+    if (c < '0' || c > '9') return index;
+    position = position * 10 + static_cast<size_t>(c - '0');
+  }
+  return position;
+}
+
 const TagValue* rawValue(const Tag& item, std::string_view key) {
   const TagProperty* p = item.findProperty(key);
   return p ? &p->value() : nullptr;
@@ -43,10 +58,20 @@ std::string flagText(std::string_view text, std::string_view yes) {
   return text == yes ? "1" : "0";
 }
 
+int64_t truncateToInt64(double value) {
+  // 2^63 is exact as a double; NaN fails both comparisons.
+  constexpr double kLimit = 9223372036854775808.0;
+  if (!(value >= -kLimit && value < kLimit)) return 0;
+  return static_cast<int64_t>(value);
+}
+
 int64_t sizeInMegabytes(std::string_view size_text) {
-  float mb = static_cast<float>(SizeText::toGigabytes(size_text) * 1024.0);
-  if (!(mb > -9.2e18f && mb < 9.2e18f)) return 0;
-  return static_cast<int64_t>(mb);
+  double mb = SizeText::toGigabytes(size_text) * 1024.0;
+  // The range test comes before the narrowing: a double beyond the float
+  // range must not be converted to float at all.
+  constexpr double kLimit = 9.2e18;
+  if (!(mb > -kLimit && mb < kLimit)) return 0;
+  return truncateToInt64(static_cast<float>(mb));
 }
 
 Tag& addComplexRecord(Tag& parent, std::string_view name) {

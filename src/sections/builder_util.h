@@ -3,6 +3,8 @@
 #ifndef CVN_SECTIONS_BUILDER_UTIL_H_
 #define CVN_SECTIONS_BUILDER_UTIL_H_
 
+#include <cstddef>
+#include <cstdint>
 #include <string>
 #include <string_view>
 
@@ -14,6 +16,10 @@ namespace cvn {
 const Tag* findItems(const TagTree& raw, std::string_view data_type);
 /// The first child of "_items" of `data_type`, or null.
 const Tag* findFirstItem(const TagTree& raw, std::string_view data_type);
+/// The raw position of an entry of a converted array: N for a tag named
+/// "itemN", else `index` (its place among its siblings). Array elements that
+/// the converter stores nothing for leave no tag, so names can have gaps.
+size_t itemPosition(const Tag& item, size_t index);
 
 /// The raw key's value, or null when the key is missing.
 const TagValue* rawValue(const Tag& item, std::string_view key);
@@ -32,7 +38,11 @@ void copyFieldIfPresent(Tag& record, std::string_view field, const Tag& item,
 std::string flagText(std::string_view text, std::string_view yes);
 
 /// SizeText::toGigabytes x 1024, narrowed to float, truncated to an integer.
+/// Sizes beyond the integer range (and texts such as "nan GB") give 0.
 int64_t sizeInMegabytes(std::string_view size_text);
+/// `value` truncated toward zero, or 0 when it does not fit an int64_t, so
+/// that no out-of-range conversion can happen.
+int64_t truncateToInt64(double value);
 
 /// A complex record: the parent gets an empty-text property named `name`
 /// annotated "complex", then the child tag of that name is added.

@@ -1,0 +1,87 @@
+// The "Processors" section: one entry per processor package, with the
+// machine-wide figures of the hardware overview spread over the packages.
+#include <cmath>
+#include <cstdlib>
+#include <string>
+
+#include "sections/builder_util.h"
+#include "sections/sections.h"
+#include "zxml/size_text.h"
+
+namespace cvn {
+namespace {
+
+// A package count beyond this is not a real machine but a damaged value; it
+// must not make the builder write millions of entries.
+constexpr int64_t kMaxPackages = 256;
+
+int64_t readCoreCount(const Tag& item) {
+  const TagValue* count = rawValue(item, "number_processors");
+  if (!count) count = rawValue(item, "number_cpus");
+  if (!count) return 1;
+  return count->isInt() ? count->asInt() : 0;
+}
+
+// KB per package from the whole-machine form, else from the per-core forms
+// multiplied by the core count; 0 when the profiler reports none of them.
+int64_t cacheSizePerPackage(const Tag& item, const char* whole_key, const char* core_key,
+                            const char* size_key, int64_t cores, int64_t packages) {
+  if (hasKey(item, whole_key))
+    return truncateToInt64(SizeText::toKilobytes(rawText(item, whole_key))) / packages;
+  for (const char* key : {core_key, size_key}) {
+    if (hasKey(item, key)) {
+      double kb = SizeText::toKilobytes(rawText(item, key));
+      return truncateToInt64(static_cast<double>(cores) * kb / static_cast<double>(packages));
+    }
+  }
+  return 0;
+}
+
+// "2.66 GHz" in MHz. A decimal comma is read like a point, as in size texts.
+// GHz x 1000 can land a hair below the whole number it stands for (2.01 x
+// 1000 is 2009.99...), so a result within a millionth of a whole number is
+// taken as that number before truncating.
+int64_t speedInMegahertz(const std::string& text) {
+  std::string number = firstWord(text);
+  for (char& c : number)
+    if (c == ',') c = '.';
+  double mhz = std::strtod(number.c_str(), nullptr) * 1000.0;
+  double nearest = std::round(mhz);
+  if (std::fabs(mhz - nearest) < 1e-6) mhz = nearest;
+  return truncateToInt64(mhz);
+}
+
+}  // namespace
+
+void buildProcessorsSection(TagTree& snapshot, const TagTree& raw) {
+  const Tag* item = findFirstItem(raw, "SPHardwareDataType");
+  if (!item) return;
+  int64_t packages = 1;
+  if (const TagValue* value = rawValue(*item, "packages")) {
+    if (!value->isInt()) return;
+    packages = value->asInt();
+    if (packages < 1 || packages > kMaxPackages) return;
+  }
+  int64_t cores = readCoreCount(*item);
+  int64_t l2 =
+      cacheSizePerPackage(*item, "l2_cache", "l2_cache_core", "l2_cache_size", cores, packages);
+  int64_t l3 =
+      cacheSizePerPackage(*item, "l3_cache", "l3_cache_core", "l3_cache_size", cores, packages);
+  const TagValue* speed = rawValue(*item, "current_processor_speed");
+  bool has_speed = speed && speed->isText();
+  int64_t megahertz = has_speed ? speedInMegahertz(speed->text()) : 0;
+  const TagValue* cpu_type = rawValue(*item, "cpu_type");
+
+  for (int64_t p = 1; p <= packages; ++p) {
+    Tag& processors = snapshot.top().addChild("Processors");
+    std::string name = formatText("Processor:%lld", static_cast<long long>(p));
+    Tag& processor = processors.setChildValue(
+        name, cpu_type ? *cpu_type : TagValue(formatText("CPU #%lld", static_cast<long long>(p))));
+    processor.setProperty("core-count", TagValue(cores));
+    processor.setProperty("l2-cache-size", TagValue(l2));
+    processor.setProperty("l3-cache-size", TagValue(l3));
+    if (has_speed) processor.setProperty("current-clock-speed", TagValue(megahertz));
+  }
+}
+
+}  // namespace cvn
