@@ -191,6 +191,21 @@ TEST(PlistTest, StringsKeepTheirBytes) {
   EXPECT_EQ(parsed("<dict><key>k\x01\r</key><string>v</string></dict>"), "{k\x01\r:s\"v\"}");
 }
 
+TEST(PlistTest, LineEndsAndCommentsOutsideValuesDoNotMatter) {
+  std::string lf =
+      "<?xml version=\"1.0\"?>\n<!-- made by hand \x01 -->\n<plist>\n<dict>\n"
+      "<?pi x?><key>a</key>\n<!-- c -->\n<integer>1</integer>\n</dict>\n</plist>\n";
+  std::string crlf;
+  for (char c : lf) crlf += c == '\n' ? std::string("\r\n") : std::string(1, c);
+  for (const std::string& doc : {lf, crlf}) {
+    PlistValue value;
+    std::string warning;
+    ASSERT_TRUE(parsePlist(doc, &value, &warning));
+    EXPECT_EQ(plistText(value), "{a:i1}");
+    EXPECT_EQ(warning, "");
+  }
+}
+
 TEST(PlistTest, RepeatedKeyKeepsFirstPositionAndLastValue) {
   std::string body = "<dict>";
   for (int i = 0; i < 40; ++i)

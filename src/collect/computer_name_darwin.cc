@@ -31,7 +31,7 @@ std::string readComputerName() {
   if (CFStringGetCString(name, buffer.data(), capacity, kCFStringEncodingUTF8))
     text = buffer.data();
   CFRelease(name);
-  return text;
+  return text.empty() ? hostName() : text;
 }
 
 }  // namespace cvn

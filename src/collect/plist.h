@@ -41,8 +41,12 @@ struct PlistEntry {
 };
 
 /// Parses an XML property list. Returns false (and leaves `out` empty) only
-/// when the text is not XML at all; a document that breaks off or holds a
-/// value CoreFoundation could not read keeps everything else that was read.
+/// when no value could be read at all: the text is not XML, or it breaks
+/// before its first value. A document that breaks off or is malformed later
+/// keeps every value read before the break (open containers are closed), and
+/// a single value CoreFoundation could not read is dropped with its key while
+/// the rest is kept. Raw control characters, CR and bytes that are not UTF-8
+/// are kept byte for byte in strings and keys. Nothing is ever fetched.
 /// `warning`, when given, receives a description of the first problem.
 bool parsePlist(std::string_view document, PlistValue* out, std::string* warning = nullptr);
 
