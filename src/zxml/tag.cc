@@ -1,6 +1,6 @@
 #include "zxml/tag.h"
 
-#include <cinttypes>
+#include <charconv>
 #include <cstdio>
 #include <cstring>
 
@@ -36,19 +36,32 @@ void TagValue::clear() {
   std::string().swap(text_);
 }
 
+namespace {
+
+// Large enough for "%.2lf" of the largest double (309 digits, sign, ".00").
+constexpr size_t kNumberRoom = 400;
+
+// to_chars formats exactly as "%lld" and "%.2lf" do in the C locale, without
+// the cost of printf on every value of a large tree.
+size_t formatNumber(const TagValue& v, char* out) {
+  std::to_chars_result r =
+      v.isInt() ? std::to_chars(out, out + kNumberRoom, v.asInt())
+                : std::to_chars(out, out + kNumberRoom, v.asReal(), std::chars_format::fixed, 2);
+  return static_cast<size_t>(r.ptr - out);
+}
+
+}  // namespace
+
 size_t TagValue::textLength() const {
-  char buf[512];
+  char buf[kNumberRoom];
   switch (type_) {
     case Type::kNone:
       return 0;
     case Type::kBool:
       return int_ ? 4 : 5;
     case Type::kInt:
-      return static_cast<size_t>(std::snprintf(buf, sizeof buf, "%" PRId64, int_));
     case Type::kReal:
-      // Huge doubles print hundreds of digits with "%.2lf"; snprintf measures
-      // them exactly even when they do not fit the scratch buffer.
-      return static_cast<size_t>(std::snprintf(buf, sizeof buf, "%.2lf", real_));
+      return formatNumber(*this, buf);
     case Type::kText:
       return text_.size();
   }
@@ -64,9 +77,14 @@ size_t TagValue::writeText(char* out) const {
       std::memcpy(out, int_ ? "true" : "false", int_ ? 5 : 6);
       return int_ ? 4 : 5;
     case Type::kInt:
-      return static_cast<size_t>(std::sprintf(out, "%" PRId64, int_));
-    case Type::kReal:
-      return static_cast<size_t>(std::sprintf(out, "%.2lf", real_));
+    case Type::kReal: {
+      // Formatted aside first: the caller only promises textLength() + 1.
+      char buf[kNumberRoom];
+      size_t n = formatNumber(*this, buf);
+      std::memcpy(out, buf, n);
+      out[n] = '\0';
+      return n;
+    }
     case Type::kText:
       std::memcpy(out, text_.data(), text_.size());
       out[text_.size()] = '\0';
