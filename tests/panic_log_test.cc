@@ -6,8 +6,8 @@
 
 #include <cerrno>
 #include <cstdlib>
+#include <cstring>
 #include <fstream>
-#include <regex>
 #include <sstream>
 #include <string>
 
@@ -30,11 +30,19 @@ class PanicLogTest : public ::testing::Test {
     ASSERT_EQ(chdir(old_cwd_.c_str()), 0);
     rmdir(dir_.c_str());
   }
+  // The log with every time field's digits replaced by "T".
   static std::string readLog() {
     std::ifstream in("panic.log");
     std::stringstream s;
     s << in.rdbuf();
-    return s.str();
+    std::string log = s.str();
+    for (size_t at = log.find("Time: "); at != std::string::npos; at = log.find("Time: ", at)) {
+      at += 6;
+      size_t end = log.find_first_not_of("0123456789", at);
+      if (end == at) break;
+      log.replace(at, end - at, "T");
+    }
+    return log;
   }
   std::string old_cwd_, dir_;
 };
@@ -50,12 +58,12 @@ TEST_F(PanicLogTest, AppendsOneLinePerCallAndReportsOnStderr) {
   PanicLog::reportPanic("main.cc", 9, -1, 0, nullptr);
   EXPECT_EQ(::testing::internal::GetCapturedStderr(),
             "Error at Line: 9;\nErrnum: 0;\nFile name: main.cc;\nMessage: ;\n Code: -1;\n");
-  std::regex expected(
-      "PANIC EXIT\\. Application: cvnmacagent, Time: [0-9]+, File: scan\\.cc, Line: 42, "
-      "Code: #7, Error: #2 \\(No such file or directory\\), Message: \"no profiler\"\n"
-      "PANIC EXIT\\. Application: cvnmacagent, Time: [0-9]+, File: main\\.cc, Line: 9, "
-      "Code: #-1, Error: #0 \\([^)]*\\), Message: \"\"\n");
-  EXPECT_TRUE(std::regex_match(readLog(), expected)) << readLog();
+  EXPECT_EQ(readLog(),
+            "PANIC EXIT. Application: cvnmacagent, Time: T, File: scan.cc, Line: 42, Code: #7, "
+            "Error: #2 (No such file or directory), Message: \"no profiler\"\n"
+            "PANIC EXIT. Application: cvnmacagent, Time: T, File: main.cc, Line: 9, Code: #-1, "
+            "Error: #0 (" +
+                std::string(std::strerror(0)) + "), Message: \"\"\n");
 }
 
 TEST_F(PanicLogTest, UnopenableLogStillReportsOnStderr) {

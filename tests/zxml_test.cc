@@ -4,6 +4,7 @@
 
 #include <cmath>
 #include <cstdio>
+#include <cstring>
 #include <string>
 #include <vector>
 
@@ -189,6 +190,29 @@ TEST(ZxmlCompressDeathTest, AssertionNamesTheModule) {
                "^zxml/QAXfile:77: failed assertion `ret == Z_STREAM_END'\n");
   EXPECT_DEATH(failAssertion(kTagModule, 5, "strm.avail_in == 0"),
                "^zxml/tag:5: failed assertion `strm.avail_in == 0'\n");
+}
+
+// The dump's own number formatting against printf on awkward values.
+TEST(ZxmlTextTest, RealTextsMatchPrintf) {
+  std::vector<double> values = {0.0,    -0.0,   0.005,    0.015, 0.025,     1.005,  2.675,
+                                -0.001, -0.005, 99.995,   0.125, 0.375,     1e15,   8.99e16,
+                                9e16,   1e17,   -123.456, 4.0,   2.0 / 3.0, 1e-320, -1e300};
+  uint64_t bits = 0x9E3779B97F4A7C15ull;
+  for (int i = 0; i < 20000; ++i) {
+    bits ^= bits << 13;
+    bits ^= bits >> 7;
+    bits ^= bits << 17;
+    int scale = static_cast<int>(bits % 40) - 20;
+    values.push_back(static_cast<double>(static_cast<int64_t>(bits >> 11) % 2000001 - 1000000) /
+                     std::pow(10.0, (scale % 6) + 3) * std::pow(10.0, scale / 4));
+  }
+  for (double v : values) {
+    char expected[400];
+    std::snprintf(expected, sizeof expected, "%.2lf", v);
+    TagValue value(v);
+    ASSERT_EQ(value.textForm(), expected) << v;
+    ASSERT_EQ(value.textLength(), std::strlen(expected)) << v;
+  }
 }
 
 }  // namespace

@@ -24,6 +24,20 @@ constexpr size_t kHeaderLength = sizeof kHeader - 1;
 #define CVN_CHECK(module, expr) \
   ((expr) ? static_cast<void>(0) : failAssertion((module), __LINE__, #expr))
 
+// Text values dominate real trees; they are measured and copied here without
+// a call, numbers go through TagValue.
+inline size_t valueLength(const TagValue& v) {
+  return v.isText() ? v.text().size() : v.isNone() ? 0 : v.textLength();
+}
+
+inline char* writeValue(char* out, const TagValue& v) {
+  if (v.isText()) {
+    std::memcpy(out, v.text().data(), v.text().size());
+    return out + v.text().size();
+  }
+  return v.isNone() ? out : out + v.writeText(out);
+}
+
 size_t measureAnnotations(const std::vector<Annotation>& annotations) {
   size_t size = 0;
   for (const Annotation& a : annotations) size += a.key.size() + a.text.size() + 3;  // ~ = \n
@@ -31,7 +45,7 @@ size_t measureAnnotations(const std::vector<Annotation>& annotations) {
 }
 
 size_t measureTag(const Tag& tag) {
-  size_t size = 1 + tag.name().size() + 1 + (tag.value() ? tag.value()->textLength() : 0) + 1;
+  size_t size = 1 + tag.name().size() + 1 + (tag.value() ? valueLength(*tag.value()) : 0) + 1;
   size += measureAnnotations(tag.annotations());
   for (const auto& p : tag.properties())
     size +=
@@ -64,13 +78,13 @@ char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
   *out++ = branch ? '+' : '*';
   out = writeBytes(out, tag.name());
   *out++ = '=';
-  if (tag.value()) out += tag.value()->writeText(out);
+  if (tag.value()) out = writeValue(out, *tag.value());
   *out++ = '\n';
   out = writeAnnotations(out, tag.annotations());
   for (const auto& p : tag.properties()) {
     out = writeBytes(out, p->name());
     *out++ = '=';
-    out += p->value().writeText(out);
+    out = writeValue(out, p->value());
     *out++ = '\n';
     out = writeAnnotations(out, p->annotations());
   }
