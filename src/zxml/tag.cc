@@ -1,8 +1,10 @@
 #include "zxml/tag.h"
 
-#include <cinttypes>
+#include <charconv>
+#include <cmath>
 #include <cstdio>
 #include <cstring>
+#include <limits>
 
 namespace cvn {
 
@@ -36,19 +38,54 @@ void TagValue::clear() {
   std::string().swap(text_);
 }
 
+namespace {
+
+// Large enough for "%.2lf" of the largest double (309 digits, sign, ".00").
+constexpr size_t kNumberRoom = 400;
+
+// "%.2lf" of a double, exactly as printf rounds it: x * 100 is exact in a
+// 64-bit-mantissa long double, so rounding that product to the nearest
+// integer (ties to even, done by hand: nearbyintl is slow) is rounding the
+// exact binary value. Plain to_chars
+// gives the same text but costs several times more on large trees.
+size_t formatReal(double x, char* out) {
+  if constexpr (std::numeric_limits<long double>::digits >= 60) {
+    if (std::isfinite(x) && std::fabs(x) < 9.0e16) {
+      long double scaled = std::fabs(static_cast<long double>(x) * 100.0L);
+      uint64_t hundredths = static_cast<uint64_t>(scaled);
+      long double fraction = scaled - static_cast<long double>(hundredths);
+      if (fraction > 0.5L || (fraction == 0.5L && (hundredths & 1) != 0)) ++hundredths;
+      char* p = out;
+      if (std::signbit(x)) *p++ = '-';
+      p = std::to_chars(p, p + 24, hundredths / 100).ptr;
+      *p++ = '.';
+      *p++ = static_cast<char>('0' + hundredths % 100 / 10);
+      *p++ = static_cast<char>('0' + hundredths % 10);
+      return static_cast<size_t>(p - out);
+    }
+  }
+  return static_cast<size_t>(
+      std::to_chars(out, out + kNumberRoom, x, std::chars_format::fixed, 2).ptr - out);
+}
+
+// to_chars formats exactly as "%lld" does, without printf's overhead.
+size_t formatNumber(const TagValue& v, char* out) {
+  if (v.isReal()) return formatReal(v.asReal(), out);
+  return static_cast<size_t>(std::to_chars(out, out + kNumberRoom, v.asInt()).ptr - out);
+}
+
+}  // namespace
+
 size_t TagValue::textLength() const {
-  char buf[512];
+  char buf[kNumberRoom];
   switch (type_) {
     case Type::kNone:
       return 0;
     case Type::kBool:
       return int_ ? 4 : 5;
     case Type::kInt:
-      return static_cast<size_t>(std::snprintf(buf, sizeof buf, "%" PRId64, int_));
     case Type::kReal:
-      // Huge doubles print hundreds of digits with "%.2lf"; snprintf measures
-      // them exactly even when they do not fit the scratch buffer.
-      return static_cast<size_t>(std::snprintf(buf, sizeof buf, "%.2lf", real_));
+      return formatNumber(*this, buf);
     case Type::kText:
       return text_.size();
   }
@@ -64,9 +101,14 @@ size_t TagValue::writeText(char* out) const {
       std::memcpy(out, int_ ? "true" : "false", int_ ? 5 : 6);
       return int_ ? 4 : 5;
     case Type::kInt:
-      return static_cast<size_t>(std::sprintf(out, "%" PRId64, int_));
-    case Type::kReal:
-      return static_cast<size_t>(std::sprintf(out, "%.2lf", real_));
+    case Type::kReal: {
+      // Formatted aside first: the caller only promises textLength() + 1.
+      char buf[kNumberRoom];
+      size_t n = formatNumber(*this, buf);
+      std::memcpy(out, buf, n);
+      out[n] = '\0';
+      return n;
+    }
     case Type::kText:
       std::memcpy(out, text_.data(), text_.size());
       out[text_.size()] = '\0';

@@ -1,0 +1,66 @@
+// The snapshot container: serialised trees and raw data back to back, a
+// compressed INI-like directory and a 14-byte trailer ending in "QAX!".
+#ifndef CVN_ZXML_QAXFILE_H_
+#define CVN_ZXML_QAXFILE_H_
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace cvn {
+
+class TagTree;
+
+enum SnapshotBlockType : int { kAssetInfoBlock = 0, kSnapshotBlock = 1, kCustomDataBlock = 2 };
+
+struct SnapshotBlock {
+  int type = kSnapshotBlock;
+  /// The bytes were supplied ready-made (raw data), not made from a tree.
+  bool raw = false;
+  bool compressed = false;
+  bool split = false;
+  std::vector<uint8_t> data;
+  /// What the directory needs from the tree, taken when the block was made.
+  std::string top_name;
+  std::string timestamp;
+  /// File offset, fixed while the directory is laid out.
+  uint64_t offset = 0;
+  uint64_t length() const { return data.size(); }
+};
+
+class SnapshotFile {
+ public:
+  /// `little_endian` selects the byte order of the directory offset in the
+  /// trailer (false: big-endian).
+  explicit SnapshotFile(bool little_endian) : little_endian_(little_endian) {}
+
+  /// Serialises `tree` now and appends it as a block of `type`.
+  void addTree(const TagTree& tree, int type, bool split, bool compressed);
+  /// Compresses `bytes` into a custom-data block (a bare zlib stream).
+  void addRawData(const uint8_t* bytes, size_t length);
+  /// Writes the file in one piece; false if it cannot be created or written.
+  bool save(const std::string& file_name, bool compress_directory);
+  /// The bytes save() writes.
+  std::vector<uint8_t> makeImage(bool compress_directory);
+
+  /// Now, local time: "yyyyMMddHHmmss.000000" and the zone in minutes
+  /// ("+180", "-300", "+0"), or "yyyy-MM-dd" for the short form.
+  static std::string makeTimestamp(bool long_form);
+
+  const std::vector<std::unique_ptr<SnapshotBlock>>& blocks() const { return blocks_; }
+  bool hasRawData() const { return has_raw_data_; }
+
+ private:
+  size_t measureDirectory();
+  std::string writeDirectory() const;
+
+  bool little_endian_;
+  bool has_raw_data_ = false;
+  std::vector<std::unique_ptr<SnapshotBlock>> blocks_;
+};
+
+}  // namespace cvn
+
+#endif  // CVN_ZXML_QAXFILE_H_

@@ -1,0 +1,224 @@
+// The ZXML text form of a tag tree and its block layouts.
+#include "zxml/zXML.h"
+
+#include <zlib.h>
+
+#include <cinttypes>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <string>
+
+#include "zxml/tag.h"
+
+namespace cvn {
+
+namespace {
+
+constexpr size_t kChunk = 16384;
+// Room the size estimate leaves beyond the measured text.
+constexpr size_t kSlack = 102;
+constexpr char kHeader[] = "\xEF\xBB\xBF?zxml\n";
+constexpr size_t kHeaderLength = sizeof kHeader - 1;
+
+#define CVN_CHECK(module, expr) \
+  ((expr) ? static_cast<void>(0) : failAssertion((module), __LINE__, #expr))
+
+// Text values dominate real trees; they are measured and copied here without
+// a call, numbers go through TagValue.
+inline size_t valueLength(const TagValue& v) {
+  return v.isText() ? v.text().size() : v.isNone() ? 0 : v.textLength();
+}
+
+inline char* writeValue(char* out, const TagValue& v) {
+  if (v.isText()) {
+    std::memcpy(out, v.text().data(), v.text().size());
+    return out + v.text().size();
+  }
+  return v.isNone() ? out : out + v.writeText(out);
+}
+
+size_t measureAnnotations(const std::vector<Annotation>& annotations) {
+  size_t size = 0;
+  for (const Annotation& a : annotations) size += a.key.size() + a.text.size() + 3;  // ~ = \n
+  return size;
+}
+
+size_t measureTag(const Tag& tag) {
+  size_t size = 1 + tag.name().size() + 1 + (tag.value() ? valueLength(*tag.value()) : 0) + 1;
+  size += measureAnnotations(tag.annotations());
+  for (const auto& p : tag.properties())
+    size +=
+        p->name().size() + 1 + p->value().textLength() + 1 + measureAnnotations(p->annotations());
+  for (const auto& c : tag.children()) size += measureTag(*c);
+  if (tag.kind() == Tag::Kind::kBranch) size += 2;
+  return size;
+}
+
+char* writeBytes(char* out, const std::string& s) {
+  std::memcpy(out, s.data(), s.size());
+  return out + s.size();
+}
+
+char* writeAnnotations(char* out, const std::vector<Annotation>& annotations) {
+  for (const Annotation& a : annotations) {
+    *out++ = '~';
+    out = writeBytes(out, a.key);
+    *out++ = '=';
+    out = writeBytes(out, a.text);
+    *out++ = '\n';
+  }
+  return out;
+}
+
+// Writes the tag's lines; the flags affect this tag only, never its
+// descendants.
+char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
+  bool branch = tag.kind() == Tag::Kind::kBranch;
+  *out++ = branch ? '+' : '*';
+  out = writeBytes(out, tag.name());
+  *out++ = '=';
+  if (tag.value()) out = writeValue(out, *tag.value());
+  *out++ = '\n';
+  out = writeAnnotations(out, tag.annotations());
+  for (const auto& p : tag.properties()) {
+    out = writeBytes(out, p->name());
+    *out++ = '=';
+    out = writeValue(out, p->value());
+    *out++ = '\n';
+    out = writeAnnotations(out, p->annotations());
+  }
+  if (!branch) return out;
+  if (!no_children)
+    for (const auto& c : tag.children()) out = writeTag(out, *c, false, false);
+  if (!no_close) {
+    *out++ = '-';
+    *out++ = '\n';
+  }
+  return out;
+}
+
+// Kept out of line: inlined into the callers, g++ loses track of the buffer
+// size and warns about the final NUL.
+__attribute__((noinline)) size_t writeDocument(const Tag& document, char* start, bool no_close,
+                                               bool no_children) {
+  char* out = start;
+  std::memcpy(out, kHeader, kHeaderLength);
+  out += kHeaderLength;
+  for (const auto& c : document.children()) out = writeTag(out, *c, no_close, no_children);
+  *out = '\0';
+  return static_cast<size_t>(out - start);
+}
+
+void appendUint32(std::vector<uint8_t>& out, uint32_t value, bool native) {
+  if (!native) value = __builtin_bswap32(value);
+  uint8_t bytes[4];
+  std::memcpy(bytes, &value, 4);
+  out.insert(out.end(), bytes, bytes + 4);
+}
+
+// Sections of a split block: the top level alone, then each child of the top
+// tag, followed by a directory of section offsets and lengths.
+std::vector<uint8_t> serialiseSplit(const TagTree& tree, bool compressed) {
+  std::vector<char> buffer(tree.textSize() + 1, '\0');
+  std::string directory;
+  char* start = buffer.data();
+  char* out = start + tree.dumpText(start, 0, true, true);
+  auto addSection = [&](const std::string& name, const char* begin, const char* end) {
+    std::string line = "[" + name + "]\noffset=" + std::to_string(begin - start) +
+                       "\nlength=" + std::to_string(end - begin) + "\n";
+    directory += line;
+  };
+  addSection("Root", start, out);
+  for (const auto& child : tree.top().children()) {
+    char* begin = out;
+    out = writeTag(out, *child, false, false);
+    addSection(child->name(), begin, out);
+  }
+  size_t directory_position = static_cast<size_t>(out - start);
+  std::vector<uint8_t> payload(start, out);
+  payload.insert(payload.end(), directory.begin(), directory.end());
+  std::vector<uint8_t> block =
+      compressed ? compressLevel9(payload.data(), payload.size(), kZxmlModule, 6) : payload;
+  appendUint32(block, static_cast<uint32_t>(directory_position), tree.nativeByteOrder());
+  block.push_back(0x01);
+  block.push_back(compressed ? 0x01 : 0x00);
+  return block;
+}
+
+}  // namespace
+
+void failAssertion(const char* module, unsigned line, const char* expression) {
+  std::fprintf(stderr, "%s:%u: failed assertion `%s'\n", module, line, expression);
+  std::abort();
+}
+
+std::vector<uint8_t> compressLevel9(const uint8_t* data, size_t size, const char* module,
+                                    size_t spare) {
+  std::vector<uint8_t> out;
+  z_stream strm;
+  std::memset(&strm, 0, sizeof strm);
+  if (deflateInit(&strm, Z_BEST_COMPRESSION) != Z_OK) return out;
+  // The bound zlib guarantees for level 9 with the default window: tiny or
+  // incompressible input grows, and one spare output area keeps the loop
+  // below from reallocating.
+  out.reserve(size + (size >> 12) + (size >> 14) + (size >> 25) + 13 + kChunk + spare);
+  size_t used = 0;
+  size_t remaining = size;
+  int ret = Z_OK;
+  for (;;) {
+    bool last = remaining <= kChunk;
+    size_t chunk = last ? remaining : kChunk;
+    strm.next_in = const_cast<Bytef*>(data);
+    strm.avail_in = static_cast<uInt>(chunk);
+    int flush = last ? Z_FINISH : Z_NO_FLUSH;
+    do {
+      out.resize(used + kChunk);
+      strm.next_out = out.data() + used;
+      strm.avail_out = kChunk;
+      ret = deflate(&strm, flush);
+      CVN_CHECK(module, ret != Z_STREAM_ERROR);
+      used += kChunk - strm.avail_out;
+    } while (strm.avail_out == 0);
+    CVN_CHECK(module, strm.avail_in == 0);
+    data += chunk;
+    remaining -= chunk;
+    if (last) break;
+  }
+  CVN_CHECK(module, ret == Z_STREAM_END);
+  deflateEnd(&strm);
+  out.resize(used);
+  return out;
+}
+
+size_t TagTree::textSize() const {
+  size_t size = kHeaderLength;
+  for (const auto& c : document().children()) size += measureTag(*c);
+  return size + kSlack;
+}
+
+size_t TagTree::dumpText(char* buffer, size_t offset, bool no_close, bool no_children) const {
+  return writeDocument(document(), buffer + offset, no_close, no_children);
+}
+
+std::vector<uint8_t> TagTree::serialise(bool compressed, bool split) const {
+  if (split) return serialiseSplit(*this, compressed);
+  size_t size = textSize();
+  if (!compressed) {
+    // The text padded with zeros to the estimated size; the zeros stand in
+    // for the split and compressed flags.
+    std::vector<uint8_t> block(size + 1, 0);
+    dumpText(reinterpret_cast<char*>(block.data()), 0, false, false);
+    block.resize(size);
+    return block;
+  }
+  std::vector<char> text(size, '\0');
+  size_t length = dumpText(text.data(), 0, false, false);
+  static constexpr uint8_t kTrailer[] = {0x00, 0x01, 'Z', 'X', 'M', 'L'};
+  std::vector<uint8_t> block = compressLevel9(reinterpret_cast<const uint8_t*>(text.data()), length,
+                                              kZxmlModule, sizeof kTrailer);
+  block.insert(block.end(), kTrailer, kTrailer + sizeof kTrailer);
+  return block;
+}
+
+}  // namespace cvn

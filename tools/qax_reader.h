@@ -1,0 +1,112 @@
+// Reads snapshot result files (".qax") back: the trailer, the directory, and
+// every block, inflated and, for trees, parsed. The only code of the project
+// that inflates; bad input gives an error text, never a crash.
+#ifndef CVN_TOOLS_QAX_READER_H_
+#define CVN_TOOLS_QAX_READER_H_
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace cvn {
+
+struct QaxAnnotation {
+  std::string key;
+  std::string text;
+};
+
+struct QaxProperty {
+  std::string name;
+  std::string value;
+  std::vector<QaxAnnotation> annotations;
+};
+
+/// A tag as the text stored it: values are texts, whatever their kind was.
+struct QaxNode {
+  std::string name;
+  bool branch = false;
+  std::string value;
+  std::vector<QaxAnnotation> annotations;
+  std::vector<QaxProperty> properties;
+  std::vector<QaxNode> children;
+
+  const QaxNode* findChild(std::string_view child_name) const;
+  const QaxProperty* findProperty(std::string_view property_name) const;
+};
+
+struct QaxTree {
+  /// The tags directly under the document; the first is the top tag.
+  std::vector<QaxNode> nodes;
+
+  const QaxNode* top() const { return nodes.empty() ? nullptr : &nodes.front(); }
+  /// The tag at a "/"-separated path below the top tag ("/Hardware/CPU" or
+  /// "Hardware/CPU"); "" and "/" give the top tag. Null when missing.
+  const QaxNode* findNode(std::string_view path) const;
+  /// The property `name` of the tag at `path`, or null.
+  const QaxProperty* findProperty(std::string_view path, std::string_view name) const;
+};
+
+struct QaxBlock {
+  enum class Kind { kTree, kRawData };
+
+  // The directory entry.
+  unsigned index = 0;
+  std::string type;  // "snapshot", "assetinfo" or "customdata"
+  uint64_t offset = 0;
+  uint64_t length = 0;
+  std::string timestamp;
+  std::string snaptype;
+  std::string id;
+
+  Kind kind = Kind::kTree;
+  bool compressed = false;
+  bool split = false;
+  /// Tree blocks: the ZXML text as stored (a split block's sections only).
+  std::string text;
+  /// A split block's section directory.
+  std::string sections;
+  QaxTree tree;
+  /// Raw-data blocks: the inflated bytes.
+  std::string data;
+};
+
+struct QaxFile {
+  uint64_t size = 0;
+  uint64_t directory_offset = 0;
+  bool little_endian = true;
+  bool directory_compressed = false;
+  std::string directory;  // the directory text, inflated
+  uint64_t count = 0;
+  uint64_t snapshot_count = 0;
+  std::vector<QaxBlock> blocks;
+  /// Oddities that do not make the file unreadable (values spanning lines).
+  std::vector<std::string> warnings;
+
+  /// The first block of that directory type, or null.
+  const QaxBlock* findBlock(std::string_view type) const;
+};
+
+/// Reads and validates the whole file. On failure `error` says what is wrong
+/// and where, in one line.
+bool readQaxFile(const std::string& path, QaxFile* out, std::string* error);
+/// The same for a file image in memory.
+bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* error);
+/// Parses ZXML text (header line included). Continuation lines are reported
+/// in `warnings` (may be null).
+bool parseZxmlText(std::string_view text, QaxTree* out, std::vector<std::string>* warnings,
+                   std::string* error);
+
+/// Inflates one complete zlib stream that must fill `size` exactly; the
+/// result is bounded to 256 MiB.
+bool inflateQaxStream(const uint8_t* data, size_t size, std::string* out, std::string* error);
+
+/// The tree as ZXML text, header line included.
+std::string renderZxmlText(const QaxTree& tree);
+/// The directory and the trees as JSON.
+std::string renderQaxJson(const QaxFile& file);
+
+}  // namespace cvn
+
+#endif  // CVN_TOOLS_QAX_READER_H_
