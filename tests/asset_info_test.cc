@@ -62,7 +62,7 @@ TEST(AssetInfoTest, WritesIdentityAndControlSummary) {
   id.manual_ip = true;
 
   auto tree = buildAssetInfo(1, snapshot, "20131115213000.000000+60", facts, id);
-  EXPECT_EQ(treeText(&tree->top()), R"(+AssetInfo=
+  EXPECT_EQ(treeText(&tree->top()), R"x(+AssetInfo=
 hostname="janes-mbp"
 ip-address="192.168.1.20"
 static-ip="1"
@@ -117,7 +117,7 @@ disk:3=1.00
 fw-status="5"
 -
 -
-)");
+)x");
 }
 
 TEST(AssetInfoTest, ASnapshotWithoutSectionsStillGivesTheSummary) {

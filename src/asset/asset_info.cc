@@ -132,8 +132,8 @@ void addDebugAssetInfo(SnapshotFile& file, uint8_t tree_flag, const std::string&
                    date, std::string());
   tree.setValue("/scan-attempt", TagValue("1"));
   tree.setValue("/error-message", TagValue("Debug scan"));
-  file.addTree(tree, SnapshotBlock::kAssetInfo, false, true);
-  file.addRawData(profiler_output.data(), profiler_output.size());
+  file.addTree(tree, kAssetInfoBlock, false, true);
+  file.addRawData(reinterpret_cast<const uint8_t*>(profiler_output.data()), profiler_output.size());
 }
 
 }  // namespace cvn

@@ -67,8 +67,7 @@ void readDisplays(const PlistValue& root, QuickFacts* facts) {
     for (const PlistValue& display : displays->array) {
       if (stringAt(&display, "spdisplays_main") != "spdisplays_yes") continue;
       facts->main_display_resolution = stringAt(&display, "spdisplays_resolution");
-      std::vector<uint8_t> edid = edidBytesFromText(stringAt(&display, "_spdisplays_edid"));
-      if (edid.size() >= 128) facts->main_display_size = edidDiagonalText(edid.data());
+      facts->main_display_size = edidDiagonalText(stringAt(&display, "_spdisplays_edid"));
       return;
     }
   }

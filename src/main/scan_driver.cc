@@ -89,7 +89,7 @@ void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::strin
   QuickFacts facts = readQuickFacts(plist, tools_.runner);
   auto raw = std::make_unique<TagTree>(native, "Macintosh");
   log(logging, "II. Parsing Data....");
-  convertPlist(plist, *raw);
+  PlistConverter(*raw).convertPlist(plist);
   log(logging, "done\n");
   log(logging, "III. Get Data For AssetInfo....");
   NetworkIdentity identity;
@@ -134,8 +134,8 @@ void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::strin
   log(logging, "done\n");
 
   SnapshotFile file(native);
-  file.addTree(snapshot, SnapshotBlock::kSnapshot, false, true);
-  file.addTree(*asset_tree, SnapshotBlock::kAssetInfo, false, true);
+  file.addTree(snapshot, kSnapshotBlock, false, true);
+  file.addTree(*asset_tree, kAssetInfoBlock, false, true);
   raw.reset();
 
   std::string host = identity.netbios_name.empty() ? computer_name : identity.netbios_name;

@@ -38,12 +38,6 @@ void writeSize(Tag& partition, std::string_view field, const SizeReading& readin
 
 }  // namespace
 
-int64_t truncateToInt64(double value) {
-  // Both bounds are exact doubles; NaN fails the test and gives 0.
-  if (!(value >= -9223372036854775808.0 && value < 9223372036854775808.0)) return 0;
-  return static_cast<int64_t>(value);
-}
-
 double bytesToDecimalGigabytes(int64_t bytes) {
   return static_cast<double>(bytes) / 1000 / 10000000 * 10;
 }

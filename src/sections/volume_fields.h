@@ -6,12 +6,10 @@
 
 #include <cstdint>
 
+#include "sections/builder_util.h"
 #include "zxml/tag.h"
 
 namespace cvn {
-
-/// `value` truncated toward zero; 0 for NaN and for values outside int64_t.
-int64_t truncateToInt64(double value);
 
 /// Bytes / 10^9 as a double.
 double bytesToDecimalGigabytes(int64_t bytes);
