@@ -14,10 +14,8 @@ trap 'rm -rf "$out_dir"' EXIT
 root=$(pwd)
 (cd "$out_dir" && echo y | PATH="$root/tests/fake_bin:$PATH" "$root/build/cvnmacagent" -log)
 result=$(ls "$out_dir"/*.qax)
-echo
-echo "== qaxdump $(basename "$result")"
-"$root/build/qaxdump" "$result"
 mkdir -p "$root/build/sample-result"
 cp "$result" "$root/build/sample-result/"
 echo
-echo "(a copy of the result file is in build/sample-result/)"
+echo "== qaxdump $(basename "$result") (a copy is in build/sample-result/)"
+"$root/build/qaxdump" "$result"

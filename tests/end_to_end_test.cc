@@ -1,0 +1,367 @@
+// Runs the real agent binary against the sample Mac: the fake Apple tools
+// come first on PATH and print its recorded outputs; the result file is read
+// back with the inspector's reader.
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cctype>
+#include <cstdio>
+#include <cstdlib>
+#include <fstream>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "qax_reader.h"
+
+namespace cvn {
+namespace {
+
+const std::string kSource = CVN_SOURCE_DIR;
+const std::string kAgent = std::string(CVN_BINARY_DIR) + "/cvnmacagent";
+const std::string kSampleName = "JANE-MBP_0026BB5C3A91.qax";
+
+std::string readFile(const std::string& path) {
+  std::ifstream in(path, std::ios::binary);
+  std::stringstream s;
+  s << in.rdbuf();
+  return s.str();
+}
+
+void writeFile(const std::string& path, const std::string& text) {
+  std::ofstream out(path, std::ios::binary | std::ios::trunc);
+  out << text;
+}
+
+std::string quote(const std::string& s) {
+  std::string q = "'";
+  for (char c : s) q += c == '\'' ? std::string("'\\''") : std::string(1, c);
+  return q + "'";
+}
+
+struct AgentRun {
+  int exit_code = -1;
+  std::string out;
+  std::string err;
+};
+
+std::string hostNamePart() {
+  char host[256] = {0};
+  gethostname(host, sizeof host - 1);
+  std::string upper;
+  for (char* c = host; *c; ++c) upper += static_cast<char>(std::toupper(static_cast<unsigned char>(*c)));
+  return upper;
+}
+
+class EndToEndTest : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    char tmpl[] = "/tmp/cvn-e2e-XXXXXX";
+    ASSERT_NE(mkdtemp(tmpl), nullptr);
+    root_ = tmpl;
+    work_ = root_ + "/work";
+    state_ = root_ + "/state";
+    ASSERT_EQ(std::system(("mkdir -p " + quote(work_) + " " + quote(state_)).c_str()), 0);
+    mac_dir_ = kSource + "/tests/sample_mac";
+  }
+  void TearDown() override { std::system(("rm -rf " + quote(root_)).c_str()); }
+
+  /// A private copy of the sample Mac that a test may edit.
+  std::string copySampleMac() {
+    std::string copy = root_ + "/mac";
+    EXPECT_EQ(std::system(("cp -r " + quote(kSource + "/tests/sample_mac") + " " + quote(copy))
+                              .c_str()),
+              0);
+    mac_dir_ = copy;
+    return copy;
+  }
+
+  AgentRun run(const std::vector<std::string>& args, const std::string& input = "",
+          const std::string& env = "") {
+    writeFile(root_ + "/stdin", input);
+    std::string command = "cd " + quote(work_) + " && PATH=" +
+                          quote(kSource + "/tests/fake_bin") + ":\"$PATH\" FAKE_MAC_DIR=" +
+                          quote(mac_dir_) + " FAKE_STATE_DIR=" + quote(state_) + " " + env + " " +
+                          quote(kAgent);
+    for (const std::string& a : args) command += " " + quote(a);
+    command += " <" + quote(root_ + "/stdin") + " >" + quote(root_ + "/out") + " 2>" +
+               quote(root_ + "/err");
+    AgentRun r;
+    int status = std::system(command.c_str());
+    r.exit_code = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    r.out = readFile(root_ + "/out");
+    r.err = readFile(root_ + "/err");
+    return r;
+  }
+
+  QaxFile readResult(const std::string& name) {
+    QaxFile file;
+    std::string error;
+    EXPECT_TRUE(readQaxFile(work_ + "/" + name, &file, &error)) << error;
+    return file;
+  }
+
+  static std::string property(const QaxTree& tree, const std::string& path,
+                              const std::string& name) {
+    const QaxProperty* p = tree.findProperty(path, name);
+    return p ? p->value : "<missing>";
+  }
+
+  std::string root_, work_, state_, mac_dir_;
+};
+
+TEST_F(EndToEndTest, SilentRunPrintsOnlyTheFileNameAndNeverOverwrites) {
+  for (const char* expected : {"JANE-MBP_0026BB5C3A91.qax", "JANE-MBP_0026BB5C3A91(1).qax",
+                               "JANE-MBP_0026BB5C3A91(2).qax"}) {
+    AgentRun r = run({"-silent"});
+    EXPECT_EQ(r.exit_code, 0);
+    EXPECT_EQ(r.out, std::string(">>>") + expected + "\n");
+    EXPECT_EQ(r.err, "");
+    EXPECT_EQ(access((work_ + "/" + expected).c_str(), R_OK), 0) << expected;
+  }
+}
+
+TEST_F(EndToEndTest, LogShowsEveryStageInOrder) {
+  AgentRun r = run({"-log"}, "y\n");
+  EXPECT_EQ(r.exit_code, 0);
+  std::string expected =
+      "Corvane scanner for MacOS X\nDo you want to start the scan of local computer?(y/n)\n"
+      "Scan started...\n"
+      "------Start Log------\nI. Collecting Data....\n"
+      "10%\n20%\n30%\n40%\n50%\n60%\n70%\n80%\n90%\n100%\ndone\n"
+      "II. Parsing Data....done\n"
+      "III. Get Data For AssetInfo....33% 66% 100% done\n"
+      "IV. PostProcess>>>\n";
+  for (int step = 1; step <= 15; ++step) expected += std::to_string(step) + "...done\n";
+  expected +=
+      "IV. PostProcess End.\n"
+      "V. Creating AssetInfo Section....done\n"
+      "VI. Generating File name....done\n"
+      "VII. Saving to file....done\n"
+      "------End Log------\n"
+      "\nScan finished. Results saved to file \"" +
+      work_ + "/" + kSampleName + "\"\n";
+  EXPECT_EQ(r.out, expected);
+}
+
+TEST_F(EndToEndTest, ConsentDecidesWhetherToScan) {
+  const struct {
+    const char* input;
+    int exit_code;
+    const char* last_line;
+  } cases[] = {
+      {"n\n", 0, "Scan canceled.\n"},
+      {"Y\n", 1, "Incorrect input. Application terminated.\n"},
+      {"", 1, "Incorrect input. Application terminated.\n"},
+  };
+  for (const auto& c : cases) {
+    AgentRun r = run({}, c.input);
+    EXPECT_EQ(r.exit_code, c.exit_code) << c.input;
+    EXPECT_EQ(r.out,
+              std::string("Corvane scanner for MacOS X\nDo you want to start the scan of local "
+                          "computer?(y/n)\n") +
+                  c.last_line);
+    EXPECT_NE(access((work_ + "/" + kSampleName).c_str(), F_OK), 0) << "no scan may run";
+  }
+}
+
+TEST_F(EndToEndTest, HelpPrintsUsageAndScansNothing) {
+  AgentRun r = run({"-silent", "-?"});
+  EXPECT_EQ(r.exit_code, 0);
+  EXPECT_NE(r.out.find("Usage: cvnmacagent [OPTION...]\n"), std::string::npos);
+  EXPECT_NE(access((work_ + "/" + kSampleName).c_str(), F_OK), 0);
+}
+
+TEST_F(EndToEndTest, ResultFileCarriesTheSampleMacsFacts) {
+  ASSERT_EQ(run({"-silent", "-login:admin"}).out, ">>>" + kSampleName + "\n");
+  QaxFile file = readResult(kSampleName);
+  ASSERT_EQ(file.blocks.size(), 2u);
+  EXPECT_EQ(file.snapshot_count, 1u);
+  const QaxBlock& snap = file.blocks[0];
+  const QaxBlock& asset = file.blocks[1];
+  EXPECT_EQ(snap.type, "snapshot");
+  EXPECT_EQ(snap.snaptype, "mac:1");
+  EXPECT_EQ(asset.type, "assetinfo");
+
+  const QaxTree& s = snap.tree;
+  EXPECT_EQ(snap.timestamp, property(s, "/", "timestamp"));
+  EXPECT_EQ(snap.timestamp.size(), 23u) << snap.timestamp;  // ...000000+0 in UTC
+  EXPECT_EQ(property(s, "/", "client-version"), "14.10.29.0");
+  EXPECT_EQ(property(s, "/", "scan-subtype"), "sstService");
+  EXPECT_EQ(property(s, "/", "snaptype"), "mac:1");
+  EXPECT_EQ(property(s, "/", "hostname"), "Jane-MBP");
+  EXPECT_EQ(property(s, "/", "domain"), "WORKGROUP");
+  EXPECT_EQ(property(s, "/", "user-name"), "jane");
+  EXPECT_EQ(property(s, "/", "ip-address"), "192.168.1.23");
+  for (const char* section : {"System", "Processors", "Memory", "Video", "Storage", "Network",
+                              "Peripherals", "OS", "User-accounts", "Software", "Processes",
+                              "Environment", "Security"}) {
+    EXPECT_NE(s.findNode(section), nullptr) << section;
+  }
+  EXPECT_EQ(property(s, "/System/Computer-system", "model"), "MacBookPro5,5");
+  EXPECT_EQ(property(s, "/Storage/Physical-disks/HDD:1", "size"), "500");
+  EXPECT_EQ(property(s, "/User-accounts/usr-acc:jane", "hdir"), "/users/jane");
+  // The agent's own process is in the table with its command line.
+  bool found_self = false;
+  for (const QaxNode& p : s.findNode("Processes")->children) {
+    const QaxProperty* cmd = p.findProperty("cmd-line");
+    if (cmd && cmd->value.find("cvnmacagent -silent") != std::string::npos) found_self = true;
+  }
+  EXPECT_TRUE(found_self);
+
+  const QaxTree& a = asset.tree;
+  const struct {
+    const char* path;
+    const char* name;
+    const char* value;
+  } fields[] = {
+      {"/", "hostname", "Jane-MBP"},
+      {"/", "ip-address", "192.168.1.23"},
+      {"/", "static-ip", "0"},
+      {"/", "login", "admin"},
+      {"/", "user-name", "jane"},
+      {"/", "virtual-type", "nvtPhysical"},
+      {"/", "mac-address", "00-26-BB-5C-3A-91"},
+      {"/", "uuid", "5F3C7A2E-9B41-4D8A-A6E2-1C0B7D94E3F1"},
+      {"/", "serial-number", "W89311JK66E"},
+      {"/control", "domain", "WORKGROUP"},
+      {"/control", "os-name", "Mac OS X v10.6 (Snow Leopard)"},
+      {"/control", "os-sp", "Update 8"},
+      {"/control", "os-ver", "10.6.8 (10K549)"},
+      {"/control", "os-arch", "32-bit"},
+      {"/control", "cpu-count", "1"},
+      {"/control", "cpu-count-virtual", "2"},
+      {"/control", "cpu-speed", "2260"},
+      {"/control", "cpu-model", "Intel Core 2 Duo"},
+      {"/control", "cpu-manuf", "GenuineIntel"},
+      {"/control", "system-model", "MacBookPro5,5"},
+      {"/control", "phys-memory", "4096"},
+      {"/control", "video-ram", "256"},
+      {"/control", "video-res", "1280 x 800"},
+      {"/control", "monitor-count", "2"},
+      {"/control", "monitor-diag", "13"},
+      {"/control", "hdd-capacity", "500.1"},
+      {"/control", "disk:1", "312.45"},
+      {"/control", "disk:2", "41.27"},
+      {"/control", "disk:3", "3.12"},
+      {"/control", "fw-status", "5"},
+  };
+  for (const auto& f : fields) EXPECT_EQ(property(a, f.path, f.name), f.value) << f.name;
+  const QaxProperty* system_disk = a.findProperty("/control", "disk:1");
+  ASSERT_NE(system_disk, nullptr);
+  ASSERT_EQ(system_disk->annotations.size(), 3u);
+  EXPECT_EQ(system_disk->annotations[0].key + "=" + system_disk->annotations[0].text,
+            "free=312450187264");
+  EXPECT_EQ(system_disk->annotations[1].key + "=" + system_disk->annotations[1].text, "free%=79");
+  EXPECT_EQ(system_disk->annotations[2].key + "=" + system_disk->annotations[2].text, "sys=1");
+  EXPECT_EQ(a.findProperty("/control", "disk:2")->annotations.size(), 2u) << "only / is sys";
+}
+
+TEST_F(EndToEndTest, DebugScanKeepsTheProfilersWholeOutput) {
+  ASSERT_EQ(run({"-debug", "-silent"}).out, ">>>" + kSampleName + "\n");
+  QaxFile file = readResult(kSampleName);
+  ASSERT_EQ(file.blocks.size(), 2u);
+  EXPECT_EQ(file.blocks[0].type, "assetinfo");
+  EXPECT_EQ(file.blocks[1].type, "customdata");
+  EXPECT_EQ(file.blocks[1].id, "rawdata");
+  EXPECT_TRUE(file.blocks[1].data == readFile(kSource + "/tests/sample_mac/profiler/full.xml"))
+      << "the raw block differs from the profiler's output";
+  const QaxTree& a = file.blocks[0].tree;
+  EXPECT_EQ(property(a, "/", "scan-type"), "nstNone");
+  EXPECT_EQ(property(a, "/", "error-message"), "Debug scan");
+  EXPECT_EQ(property(a, "/", "hostname"), "Jane-MBP");
+  EXPECT_EQ(a.findNode("/control"), nullptr);
+}
+
+TEST_F(EndToEndTest, AProfilerThatStaysSilentAtFirstIsWaitedFor) {
+  AgentRun r = run({"-silent"}, "", "FAKE_PROFILER_EMPTY_TIMES=5");
+  EXPECT_EQ(r.out, ">>>" + kSampleName + "\n");
+  QaxFile file = readResult(kSampleName);
+  EXPECT_EQ(property(file.blocks[0].tree, "/System/Computer-system", "model"), "MacBookPro5,5");
+}
+
+// Bad tool output never stops the scan: the file is written and what could
+// be read is in it.
+TEST_F(EndToEndTest, BrokenProfilerOutputStillGivesAFile) {
+  const std::string profiler = copySampleMac() + "/profiler/";
+  std::string software = readFile(profiler + "SPSoftwareDataType.xml");
+  std::string usb = readFile(profiler + "SPUSBDataType.xml");
+  // Malformed in the middle of the document: software loses its closing
+  // tags; everything before it (hardware, network) must survive.
+  size_t cut = software.find("<key>os_version</key>");
+  ASSERT_NE(cut, std::string::npos);
+  writeFile(profiler + "SPSoftwareDataType.xml",
+            software.substr(0, cut) + "<key>broken</key><string>x</dict>" +
+                software.substr(software.size() - 18));
+  writeFile(profiler + "SPAudioDataType.xml", "too short");
+  writeFile(profiler + "SPUSBDataType.xml", usb.substr(0, usb.size() / 2));
+  AgentRun r = run({"-silent"});
+  // The network locations come after the break, so the name falls back to
+  // the computer name and no address.
+  const std::string name = hostNamePart() + "_.qax";
+  EXPECT_EQ(r.out, ">>>" + name + "\n");
+  QaxFile file = readResult(name);
+  const QaxTree& s = file.blocks[0].tree;
+  EXPECT_EQ(property(s, "/System/Computer-system", "model"), "MacBookPro5,5");
+  EXPECT_EQ(property(s, "/Network/Adapters/net-adapter:2", "ip-address"), "192.168.1.23");
+  EXPECT_NE(s.findNode("User-accounts"), nullptr) << "sections that gather for themselves stay";
+}
+
+TEST_F(EndToEndTest, TextThatIsNotXmlGivesAFileWithoutProfilerData) {
+  const std::string profiler = copySampleMac() + "/profiler/";
+  writeFile(profiler + "SPHardwareDataType.xml", std::string(400, '#') + "\n");
+  AgentRun r = run({"-silent"});
+  const std::string name = hostNamePart() + "_.qax";
+  EXPECT_EQ(r.out, ">>>" + name + "\n");
+  QaxFile file = readResult(name);
+  ASSERT_EQ(file.blocks.size(), 2u);
+  EXPECT_EQ(file.blocks[0].tree.findNode("System"), nullptr);
+  EXPECT_NE(file.blocks[0].tree.findNode("User-accounts"), nullptr);
+  EXPECT_EQ(property(file.blocks[1].tree, "/", "mac-address"), "");
+}
+
+TEST_F(EndToEndTest, AnInterfaceWithoutEthernetDataLeavesTheAddressEmpty) {
+  const std::string profiler = copySampleMac() + "/profiler/";
+  std::string network = readFile(profiler + "SPNetworkDataType.xml");
+  // The hardware address key stops being found: no service matches.
+  for (size_t at; (at = network.find("<key>Ethernet</key>")) != std::string::npos;)
+    network.replace(at, 19, "<key>Ethernet_x</key>");
+  writeFile(profiler + "SPNetworkDataType.xml", network);
+  AgentRun r = run({"-silent"});
+  const std::string name = hostNamePart() + "_.qax";
+  EXPECT_EQ(r.out, ">>>" + name + "\n");
+  QaxFile file = readResult(name);
+  EXPECT_EQ(property(file.blocks[0].tree, "/", "ip-address"), "192.168.1.23");
+  EXPECT_EQ(property(file.blocks[0].tree, "/", "hostname"), "");
+  EXPECT_EQ(property(file.blocks[1].tree, "/", "mac-address"), "");
+}
+
+TEST_F(EndToEndTest, AFiftyMegabyteApplicationListIsScanned) {
+  const std::string profiler = copySampleMac() + "/profiler/";
+  std::string apps = readFile(profiler + "SPApplicationsDataType.xml");
+  size_t items = apps.find("<key>_items</key>");
+  ASSERT_NE(items, std::string::npos);
+  size_t array = apps.find("<array>", items) + 7;
+  const std::string info(9000, 'i');
+  std::string extra;
+  const int kApps = 5600;
+  for (int i = 0; i < kApps; ++i) {
+    extra += "\n\t\t\t<dict>\n\t\t\t\t<key>_name</key>\n\t\t\t\t<string>Generated " +
+             std::to_string(i) + "</string>\n\t\t\t\t<key>info</key>\n\t\t\t\t<string>" + info +
+             "</string>\n\t\t\t\t<key>version</key>\n\t\t\t\t<string>1.0</string>\n\t\t\t</dict>";
+  }
+  apps.insert(array, extra);
+  ASSERT_GT(apps.size(), 50u * 1000 * 1000);
+  writeFile(profiler + "SPApplicationsDataType.xml", apps);
+  AgentRun r = run({"-silent"});
+  EXPECT_EQ(r.out, ">>>" + kSampleName + "\n");
+  QaxFile file = readResult(kSampleName);
+  const QaxNode* software = file.blocks[0].tree.findNode("Software");
+  ASSERT_NE(software, nullptr);
+  EXPECT_NE(software->findChild("Soft:Generated 5599 1.0"), nullptr);
+  EXPECT_NE(software->findChild("Soft:Safari 5.1"), nullptr);
+}
+
+}  // namespace
+}  // namespace cvn
