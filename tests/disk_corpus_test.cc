@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 
 #include "collect/plist.h"
+#include "corpus_files.h"
 #include "collect/plist_converter.h"
 #include "fake_command_runner.h"
 #include "sections/sections.h"
@@ -16,10 +17,7 @@
 namespace cvn {
 namespace {
 
-std::string corpusDir() {
-  if (const char* dir = std::getenv("CVN_CORPUS_DIR")) return dir;
-  return CVN_SOURCE_DIR "/../shared/corpus";
-}
+std::string corpusDir() { return findCorpus().string(); }
 
 bool readRecording(const std::string& relative_path, TagTree& raw) {
   std::ifstream in(corpusDir() + "/" + relative_path, std::ios::binary);
@@ -71,8 +69,7 @@ std::string summariseRecording(const std::string& file) {
 class DiskCorpusTest : public ::testing::Test {
  protected:
   void SetUp() override {
-    std::ifstream manifest(corpusDir() + "/MANIFEST.md");
-    if (!manifest) GTEST_SKIP() << "no recorded outputs at " << corpusDir();
+    if (findCorpus().empty()) GTEST_SKIP() << "no recorded outputs at " << corpusDir();
   }
 };
 

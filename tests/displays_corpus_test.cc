@@ -9,6 +9,7 @@
 #include <string>
 
 #include "collect/plist.h"
+#include "corpus_files.h"
 #include "collect/plist_converter.h"
 #include "sections/builder_util.h"
 #include "sections/edid.h"
@@ -17,16 +18,6 @@
 
 namespace cvn {
 namespace {
-
-std::filesystem::path findCorpus() {
-  // The repository's sibling folder; a worktree sits one level deeper.
-  for (const char* candidate :
-       {CVN_SOURCE_DIR "/../shared/corpus", CVN_SOURCE_DIR "/../../shared/corpus"}) {
-    std::error_code error;
-    if (std::filesystem::is_directory(candidate, error)) return candidate;
-  }
-  return {};
-}
 
 std::string fieldText(const Tag& record, std::string_view field) {
   const TagProperty* p = record.findProperty(field);

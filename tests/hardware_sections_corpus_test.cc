@@ -11,6 +11,7 @@
 #include <string>
 
 #include "collect/plist.h"
+#include "corpus_files.h"
 #include "collect/plist_converter.h"
 #include "fake_command_runner.h"
 #include "sections/sections.h"
@@ -21,17 +22,6 @@ namespace cvn {
 namespace {
 
 namespace fs = std::filesystem;
-
-fs::path findCorpus() {
-  std::error_code error;
-  if (const char* dir = std::getenv("CVN_CORPUS_DIR"))
-    return fs::is_directory(dir, error) ? fs::path(dir) : fs::path();
-  for (const char* relative : {"/../shared/corpus", "/../../shared/corpus"}) {
-    fs::path candidate = fs::path(std::string(CVN_SOURCE_DIR) + relative);
-    if (fs::is_directory(candidate, error)) return candidate;
-  }
-  return fs::path();
-}
 
 class HardwareSectionsCorpusTest : public ::testing::Test {
  protected:

@@ -1,5 +1,5 @@
 // Runs the reader and the converter over recorded profiler outputs when a
-// folder of them is at hand (CVN_PLIST_CORPUS, else the shared corpus).
+// folder of them is at hand.
 #include <gtest/gtest.h>
 
 #include <cstdlib>
@@ -10,6 +10,7 @@
 
 #include "collect/network_identity.h"
 #include "collect/plist.h"
+#include "corpus_files.h"
 #include "collect/plist_converter.h"
 #include "plist_path_reference.h"
 #include "tree_text.h"
@@ -18,10 +19,9 @@ namespace cvn {
 namespace {
 
 TEST(PlistCorpusTest, RecordedOutputsParseAndConvert) {
-  const char* dir = std::getenv("CVN_PLIST_CORPUS");
-  std::filesystem::path root = dir ? dir : "/work/shared/corpus";
+  std::filesystem::path root = findCorpus();
+  if (root.empty()) GTEST_SKIP() << "no recorded outputs beside the sources";
   std::error_code error;
-  if (!std::filesystem::is_directory(root, error)) GTEST_SKIP() << "no corpus at " << root;
   int files = 0;
   for (const auto& entry : std::filesystem::recursive_directory_iterator(root, error)) {
     if (!entry.is_regular_file()) continue;
