@@ -8,6 +8,7 @@
 #include <cctype>
 #include <cstdio>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <string>
@@ -283,12 +284,12 @@ TEST_F(EndToEndTest, AProfilerThatStaysSilentAtFirstIsWaitedFor) {
 
 // Bad tool output never stops the scan: the file is written and what could
 // be read is in it.
-TEST_F(EndToEndTest, BrokenProfilerOutputStillGivesAFile) {
+TEST_F(EndToEndTest, BrokenProfilerOutputCostsOnlyItsOwnDataType) {
   const std::string profiler = copySampleMac() + "/profiler/";
   std::string software = readFile(profiler + "SPSoftwareDataType.xml");
   std::string usb = readFile(profiler + "SPUSBDataType.xml");
   // Malformed in the middle of the document: software loses its closing
-  // tags; everything before it (hardware, network) must survive.
+  // tags and its last keys.
   size_t cut = software.find("<key>os_version</key>");
   ASSERT_NE(cut, std::string::npos);
   writeFile(profiler + "SPSoftwareDataType.xml",
@@ -296,21 +297,25 @@ TEST_F(EndToEndTest, BrokenProfilerOutputStillGivesAFile) {
                 software.substr(software.size() - 18));
   writeFile(profiler + "SPAudioDataType.xml", "too short");
   writeFile(profiler + "SPUSBDataType.xml", usb.substr(0, usb.size() / 2));
+  writeFile(profiler + "SPHardwareDataType.xml", std::string(400, '#') + "\n");
   AgentRun r = run({"-silent"});
-  // The network locations come after the break, so the name falls back to
-  // the computer name and no address.
-  const std::string name = hostNamePart() + "_.qax";
-  EXPECT_EQ(r.out, ">>>" + name + "\n");
-  QaxFile file = readResult(name);
+  EXPECT_EQ(r.out, ">>>" + kSampleName + "\n");
+  QaxFile file = readResult(kSampleName);
   const QaxTree& s = file.blocks[0].tree;
-  EXPECT_EQ(property(s, "/System/Computer-system", "model"), "MacBookPro5,5");
+  EXPECT_EQ(s.findNode("System/Computer-system"), nullptr) << "the hardware output was no XML";
+  EXPECT_NE(s.findNode("System/Mem-slots"), nullptr);
   EXPECT_EQ(property(s, "/Network/Adapters/net-adapter:2", "ip-address"), "192.168.1.23");
-  EXPECT_NE(s.findNode("User-accounts"), nullptr) << "sections that gather for themselves stay";
+  EXPECT_EQ(property(s, "/OS/os:1", "kernel"), "Darwin 10.8.0") << "read before the break";
+  EXPECT_EQ(property(s, "/", "user-name"), "") << "lost after the break";
+  EXPECT_NE(s.findNode("Security/Firewall"), nullptr) << "types after the break survive";
+  EXPECT_EQ(property(file.blocks[1].tree, "/", "mac-address"), "00-26-BB-5C-3A-91");
 }
 
-TEST_F(EndToEndTest, TextThatIsNotXmlGivesAFileWithoutProfilerData) {
+TEST_F(EndToEndTest, OutputThatIsNoXmlAtAllGivesAFileWithoutProfilerData) {
   const std::string profiler = copySampleMac() + "/profiler/";
-  writeFile(profiler + "SPHardwareDataType.xml", std::string(400, '#') + "\n");
+  for (const auto& entry : std::filesystem::directory_iterator(profiler)) {
+    writeFile(entry.path().string(), std::string(400, '#') + "\n");
+  }
   AgentRun r = run({"-silent"});
   const std::string name = hostNamePart() + "_.qax";
   EXPECT_EQ(r.out, ">>>" + name + "\n");

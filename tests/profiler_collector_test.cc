@@ -1,5 +1,7 @@
 #include "collect/profiler_collector.h"
 
+#include "collect/plist.h"
+
 #include <gtest/gtest.h>
 
 #include <cstdio>
@@ -107,6 +109,59 @@ TEST(ProfilerCollectorTest, ProgressLinesFollowTheirSteps) {
   size_t n = std::fread(buf, 1, sizeof buf - 1, out);
   std::fclose(out);
   EXPECT_EQ(std::string(buf, n), "10%\n20%\n30%\n40%\n50%\n60%\n70%\n80%\n90%\n100%\n");
+}
+
+}  // namespace
+}  // namespace cvn
+
+namespace cvn {
+namespace {
+
+std::string typeDict(const std::string& type) {
+  return "<dict><key>_dataType</key><string>" + type + "</string></dict>\n";
+}
+
+std::vector<std::string> dataTypes(const PlistValue& root) {
+  std::vector<std::string> types;
+  for (const PlistValue& d : root.array) {
+    const PlistValue* type = d.find("_dataType");
+    types.push_back(type ? type->text : "(none)");
+  }
+  return types;
+}
+
+TEST(CollectedDocumentTest, AMalformedPieceCostsOnlyItself) {
+  FakeCommandRunner runner;
+  for (const char* type : kTypes) {
+    runner.answer(command(type),
+                  std::string(kProfilerHeader) + typeDict(type) + std::string(kProfilerFooter));
+  }
+  runner.answer(command("SPAudioDataType"), std::string(kProfilerHeader) +
+                                                "<dict><key>_dataType</key><string>broken" +
+                                                std::string(kProfilerFooter));
+  std::vector<size_t> part_ends;
+  std::string document = ProfilerCollector(runner).collect(false, nullptr, &part_ends);
+  ASSERT_EQ(part_ends.size(), 21u);
+  EXPECT_EQ(part_ends.back(), document.size());
+
+  PlistValue root;
+  ASSERT_TRUE(parseCollectedDocument(document, part_ends, &root));
+  std::vector<std::string> types = dataTypes(root);
+  ASSERT_EQ(types.size(), 21u);
+  EXPECT_EQ(types.front(), "SPHardwareDataType");
+  EXPECT_EQ(types[3], "SPParallelATADataType");
+  EXPECT_EQ(types[4], "(none)") << "audio keeps only what came before its break";
+  EXPECT_EQ(types[5], "SPBluetoothDataType");
+  EXPECT_EQ(types.back(), "SPPowerDataType");
+}
+
+TEST(CollectedDocumentTest, AWellFormedDocumentIsReadWhole) {
+  std::string document = std::string(kProfilerHeader) + typeDict("A") + typeDict("B") +
+                         std::string(kProfilerFooter);
+  PlistValue root;
+  ASSERT_TRUE(parseCollectedDocument(document, {10, document.size()}, &root));
+  EXPECT_EQ(dataTypes(root), (std::vector<std::string>{"A", "B"}));
+  EXPECT_FALSE(parseCollectedDocument("no xml here", {5, 11}, &root));
 }
 
 }  // namespace

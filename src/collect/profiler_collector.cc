@@ -1,5 +1,7 @@
 #include "collect/profiler_collector.h"
 
+#include "collect/plist.h"
+
 namespace cvn {
 
 const std::string_view kProfilerHeader =
@@ -64,8 +66,10 @@ std::string ProfilerCollector::runProfiler(std::string_view data_type, Trim trim
   return std::string();
 }
 
-std::string ProfilerCollector::collect(bool progress, std::FILE* out) {
+std::string ProfilerCollector::collect(bool progress, std::FILE* out,
+                                       std::vector<size_t>* part_ends) {
   std::string document;
+  if (part_ends) part_ends->clear();
   constexpr size_t kStepCount = sizeof kSteps / sizeof kSteps[0];
   for (size_t i = 0; i < kStepCount; ++i) {
     const Step& step = kSteps[i];
@@ -78,6 +82,9 @@ std::string ProfilerCollector::collect(bool progress, std::FILE* out) {
     } else if (trim == Trim::kLast) {
       document += kProfilerFooter;
     }
+    if (part_ends && (!part_ends->empty() ? part_ends->back() : 0) != document.size()) {
+      part_ends->push_back(document.size());
+    }
     if (progress && step.progress) {
       std::fputs(step.progress, out);
       std::fflush(out);
@@ -88,6 +95,34 @@ std::string ProfilerCollector::collect(bool progress, std::FILE* out) {
     std::fflush(out);
   }
   return document;
+}
+
+bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
+                            PlistValue* out) {
+  std::string warning;
+  bool read = parsePlist(document, out, &warning);
+  if (warning.empty() || part_ends.size() < 2) return read;
+
+  PlistValue merged;
+  merged.kind = PlistValue::Kind::kArray;
+  size_t start = 0;
+  for (size_t i = 0; i < part_ends.size(); ++i) {
+    size_t end = part_ends[i] < document.size() ? part_ends[i] : document.size();
+    if (end <= start) continue;
+    // The first piece carries the header, the last the footer; the others
+    // get both back.
+    std::string piece;
+    if (i != 0) piece += kProfilerHeader;
+    piece += document.substr(start, end - start);
+    if (i + 1 != part_ends.size()) piece += kProfilerFooter;
+    start = end;
+    PlistValue value;
+    if (!parsePlist(piece, &value) || !value.isArray()) continue;
+    for (PlistValue& element : value.array) merged.array.push_back(std::move(element));
+  }
+  if (merged.array.empty()) return read;
+  *out = std::move(merged);
+  return true;
 }
 
 }  // namespace cvn

@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "collect/command_runner.h"
 
@@ -23,7 +24,9 @@ class ProfilerCollector {
   explicit ProfilerCollector(CommandRunner& runner) : runner_(runner) {}
 
   /// The spliced document. With `progress` the percentages go to `out`.
-  std::string collect(bool progress, std::FILE* out);
+  /// `part_ends`, when given, receives the end offset of every piece
+  /// appended (one per step that added something).
+  std::string collect(bool progress, std::FILE* out, std::vector<size_t>* part_ends = nullptr);
 
   /// One data type's output, cut by byte count; empty when it is too short
   /// for the cut. A tool that prints nothing is asked again until it does.
@@ -32,6 +35,16 @@ class ProfilerCollector {
  private:
   CommandRunner& runner_;
 };
+
+struct PlistValue;
+
+/// Parses the spliced document as one property list. When that reports a
+/// problem (one data type's output was malformed or broke off), each data
+/// type's piece is read on its own instead, so one bad piece costs only its
+/// own data type, not every one after it. Returns false when nothing could
+/// be read.
+bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
+                            PlistValue* out);
 
 }  // namespace cvn
 

@@ -77,13 +77,15 @@ void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::strin
   std::time_t start = std::time(nullptr);
   log(logging, "------Start Log------\n");
   log(logging, "I. Collecting Data....\n");
-  std::string document = ProfilerCollector(tools_.runner).collect(logging, tools_.out);
+  std::vector<size_t> part_ends;
+  std::string document =
+      ProfilerCollector(tools_.runner).collect(logging, tools_.out, &part_ends);
   log(logging, "done\n");
 
   // A document that cannot be read leaves the trees without profiler data;
   // the scan still writes its file.
   PlistValue plist;
-  parsePlist(document, &plist);
+  parseCollectedDocument(document, part_ends, &plist);
   document = std::string();
 
   QuickFacts facts = readQuickFacts(plist, tools_.runner);
