@@ -81,7 +81,9 @@ std::string makeDocument(int applications) {
     doc += "\t\t\t\t<key>size_in_bytes</key>\n\t\t\t\t<integer>250000000000</integer>\n";
     doc += "\t\t\t\t</dict>\n";
   }
-  doc += "\t\t\t\t</array>\n\t\t\t\t\t</dict>\n\t\t\t\t</array>\n\t\t\t</dict>\n\t\t</array>\n\t</dict>\n";
+  doc +=
+      "\t\t\t\t</array>\n\t\t\t\t\t</dict>\n\t\t\t\t</array>\n\t\t\t</dict>\n\t\t</array>\n\t</"
+      "dict>\n";
   doc += "</array>\n</plist>\n";
   return doc;
 }
@@ -171,7 +173,10 @@ void BM_SerialiseAndSave(benchmark::State& state) {
 BENCHMARK(BM_Parse)->RangeMultiplier(2)->Range(2500, 40000)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Convert)->RangeMultiplier(2)->Range(2500, 40000)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_PostProcess)->RangeMultiplier(2)->Range(2500, 40000)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_SerialiseAndSave)->RangeMultiplier(2)->Range(2500, 40000)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_SerialiseAndSave)
+    ->RangeMultiplier(2)
+    ->Range(2500, 40000)
+    ->Unit(benchmark::kMillisecond);
 
 }  // namespace
 }  // namespace cvn

@@ -10,9 +10,12 @@ namespace {
 
 TEST(AssetInfoTest, VirtualTypeIgnoresCaseAndTakesTheFirstHit) {
   const std::pair<const char*, const char*> cases[] = {
-      {"VMware7,1", "nvtVMware"},          {"VirtualBox", "nvtVirtualBox"},
-      {"Parallels-ARM", "nvtParallels"},   {"MacBookPro5,5", "nvtPhysical"},
-      {"", "nvtPhysical"},                 {"vmware parallels", "nvtVMware"},
+      {"VMware7,1", "nvtVMware"},
+      {"VirtualBox", "nvtVirtualBox"},
+      {"Parallels-ARM", "nvtParallels"},
+      {"MacBookPro5,5", "nvtPhysical"},
+      {"", "nvtPhysical"},
+      {"vmware parallels", "nvtVMware"},
   };
   for (const auto& c : cases) EXPECT_EQ(virtualTypeOf(c.first), c.second) << c.first;
 }

@@ -8,8 +8,8 @@
 #include <gtest/gtest.h>
 
 #include "collect/plist.h"
-#include "corpus_files.h"
 #include "collect/plist_converter.h"
+#include "corpus_files.h"
 #include "fake_command_runner.h"
 #include "sections/sections.h"
 #include "zxml/tag.h"

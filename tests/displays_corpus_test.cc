@@ -9,8 +9,8 @@
 #include <string>
 
 #include "collect/plist.h"
-#include "corpus_files.h"
 #include "collect/plist_converter.h"
+#include "corpus_files.h"
 #include "sections/builder_util.h"
 #include "sections/edid.h"
 #include "sections/sections.h"

@@ -51,7 +51,8 @@ std::string hostNamePart() {
   char host[256] = {0};
   gethostname(host, sizeof host - 1);
   std::string upper;
-  for (char* c = host; *c; ++c) upper += static_cast<char>(std::toupper(static_cast<unsigned char>(*c)));
+  for (char* c = host; *c; ++c)
+    upper += static_cast<char>(std::toupper(static_cast<unsigned char>(*c)));
   return upper;
 }
 
@@ -71,20 +72,19 @@ class EndToEndTest : public ::testing::Test {
   /// A private copy of the sample Mac that a test may edit.
   std::string copySampleMac() {
     std::string copy = root_ + "/mac";
-    EXPECT_EQ(std::system(("cp -r " + quote(kSource + "/tests/sample_mac") + " " + quote(copy))
-                              .c_str()),
-              0);
+    EXPECT_EQ(
+        std::system(("cp -r " + quote(kSource + "/tests/sample_mac") + " " + quote(copy)).c_str()),
+        0);
     mac_dir_ = copy;
     return copy;
   }
 
   AgentRun run(const std::vector<std::string>& args, const std::string& input = "",
-          const std::string& env = "") {
+               const std::string& env = "") {
     writeFile(root_ + "/stdin", input);
-    std::string command = "cd " + quote(work_) + " && PATH=" +
-                          quote(kSource + "/tests/fake_bin") + ":\"$PATH\" FAKE_MAC_DIR=" +
-                          quote(mac_dir_) + " FAKE_STATE_DIR=" + quote(state_) + " " + env + " " +
-                          quote(kAgent);
+    std::string command = "cd " + quote(work_) + " && PATH=" + quote(kSource + "/tests/fake_bin") +
+                          ":\"$PATH\" FAKE_MAC_DIR=" + quote(mac_dir_) +
+                          " FAKE_STATE_DIR=" + quote(state_) + " " + env + " " + quote(kAgent);
     for (const std::string& a : args) command += " " + quote(a);
     command += " <" + quote(root_ + "/stdin") + " >" + quote(root_ + "/out") + " 2>" +
                quote(root_ + "/err");
@@ -195,9 +195,9 @@ TEST_F(EndToEndTest, ResultFileCarriesTheSampleMacsFacts) {
   EXPECT_EQ(property(s, "/", "domain"), "WORKGROUP");
   EXPECT_EQ(property(s, "/", "user-name"), "jane");
   EXPECT_EQ(property(s, "/", "ip-address"), "192.168.1.23");
-  for (const char* section : {"System", "Processors", "Memory", "Video", "Storage", "Network",
-                              "Peripherals", "OS", "User-accounts", "Software", "Processes",
-                              "Environment", "Security"}) {
+  for (const char* section :
+       {"System", "Processors", "Memory", "Video", "Storage", "Network", "Peripherals", "OS",
+        "User-accounts", "Software", "Processes", "Environment", "Security"}) {
     EXPECT_NE(s.findNode(section), nullptr) << section;
   }
   EXPECT_EQ(property(s, "/System/Computer-system", "model"), "MacBookPro5,5");
@@ -292,9 +292,9 @@ TEST_F(EndToEndTest, BrokenProfilerOutputCostsOnlyItsOwnDataType) {
   // tags and its last keys.
   size_t cut = software.find("<key>os_version</key>");
   ASSERT_NE(cut, std::string::npos);
-  writeFile(profiler + "SPSoftwareDataType.xml",
-            software.substr(0, cut) + "<key>broken</key><string>x</dict>" +
-                software.substr(software.size() - 18));
+  writeFile(profiler + "SPSoftwareDataType.xml", software.substr(0, cut) +
+                                                     "<key>broken</key><string>x</dict>" +
+                                                     software.substr(software.size() - 18));
   writeFile(profiler + "SPAudioDataType.xml", "too short");
   writeFile(profiler + "SPUSBDataType.xml", usb.substr(0, usb.size() / 2));
   writeFile(profiler + "SPHardwareDataType.xml", std::string(400, '#') + "\n");

@@ -11,8 +11,8 @@
 #include <string>
 
 #include "collect/plist.h"
-#include "corpus_files.h"
 #include "collect/plist_converter.h"
+#include "corpus_files.h"
 #include "fake_command_runner.h"
 #include "sections/sections.h"
 #include "tree_text.h"

@@ -10,8 +10,8 @@
 
 #include "collect/network_identity.h"
 #include "collect/plist.h"
-#include "corpus_files.h"
 #include "collect/plist_converter.h"
+#include "corpus_files.h"
 #include "plist_path_reference.h"
 #include "tree_text.h"
 

@@ -23,11 +23,15 @@ std::string ps(int pid) { return "ps -p" + std::to_string(pid) + " -o user=\"\" 
 
 TEST(ProcessCollectorTest, NumbersFollowTablePositionsAndSkipTheGone) {
   FixedTable table;
-  table.entries = {{0, 0, "kernel_task"}, {1, 0, "launchd"}, {57, 1, "gone"},
-                   {88, 1, "Finder"},     {90, 1, "nospace"}};
+  table.entries = {{0, 0, "kernel_task"},
+                   {1, 0, "launchd"},
+                   {57, 1, "gone"},
+                   {88, 1, "Finder"},
+                   {90, 1, "nospace"}};
   FakeCommandRunner runner;
   runner.answer(ps(1), "root /sbin/launchd\n");
-  runner.answer(ps(88), "jane     /System/Library/CoreServices/Finder.app/Contents/MacOS/Finder -psn 0_1\n");
+  runner.answer(
+      ps(88), "jane     /System/Library/CoreServices/Finder.app/Contents/MacOS/Finder -psn 0_1\n");
   runner.answer(ps(90), "justoneword\n");
   TagTree raw(true, "Macintosh");
   collectProcesses(raw, table, runner);

@@ -12,14 +12,17 @@
 namespace cvn {
 namespace {
 
-const char* const kTypes[] = {
-    "SPHardwareDataType",      "SPNetworkDataType",       "SPSoftwareDataType",
-    "SPParallelATADataType",   "SPAudioDataType",         "SPBluetoothDataType",
-    "SPFireWireDataType",      "SPDisplaysDataType",      "SPMemoryDataType",
-    "SPPrintersDataType",      "SPSerialATADataType",     "SPParallelSCSIDataType",
-    "SPUSBDataType",           "SPAirPortDataType",       "SPFirewallDataType",
-    "SPNetworkLocationDataType", "SPNetworkVolumeDataType", "SPApplicationsDataType",
-    "SPStartupItemDataType",   "SPDiscBurningDataType",   "SPPowerDataType"};
+const char* const kTypes[] = {"SPHardwareDataType",      "SPNetworkDataType",
+                              "SPSoftwareDataType",      "SPParallelATADataType",
+                              "SPAudioDataType",         "SPBluetoothDataType",
+                              "SPFireWireDataType",      "SPDisplaysDataType",
+                              "SPMemoryDataType",        "SPPrintersDataType",
+                              "SPSerialATADataType",     "SPParallelSCSIDataType",
+                              "SPUSBDataType",           "SPAirPortDataType",
+                              "SPFirewallDataType",      "SPNetworkLocationDataType",
+                              "SPNetworkVolumeDataType", "SPApplicationsDataType",
+                              "SPStartupItemDataType",   "SPDiscBurningDataType",
+                              "SPPowerDataType"};
 
 std::string command(const std::string& type) {
   return "system_profiler -detailLevel full -xml " + type;
@@ -156,8 +159,8 @@ TEST(CollectedDocumentTest, AMalformedPieceCostsOnlyItself) {
 }
 
 TEST(CollectedDocumentTest, AWellFormedDocumentIsReadWhole) {
-  std::string document = std::string(kProfilerHeader) + typeDict("A") + typeDict("B") +
-                         std::string(kProfilerFooter);
+  std::string document =
+      std::string(kProfilerHeader) + typeDict("A") + typeDict("B") + std::string(kProfilerFooter);
   PlistValue root;
   ASSERT_TRUE(parseCollectedDocument(document, {10, document.size()}, &root));
   EXPECT_EQ(dataTypes(root), (std::vector<std::string>{"A", "B"}));

@@ -76,7 +76,8 @@ void writeDiskEntries(TagTree& tree, const TagTree& snapshot) {
 std::string virtualTypeOf(const std::string& machine_model) {
   std::string lower;
   lower.reserve(machine_model.size());
-  for (char c : machine_model) lower += static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+  for (char c : machine_model)
+    lower += static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
   if (lower.find("vmware") != std::string::npos) return "nvtVMware";
   if (lower.find("virtualbox") != std::string::npos) return "nvtVirtualBox";
   if (lower.find("parallels") != std::string::npos) return "nvtParallels";

@@ -24,16 +24,16 @@ struct Step {
 // The order is fixed: the first type keeps the document header, the last
 // one the footer.
 constexpr Step kSteps[] = {
-    {"SPHardwareDataType", nullptr},        {"SPNetworkDataType", "10%\n"},
-    {"SPSoftwareDataType", nullptr},        {"SPParallelATADataType", "20%\n"},
-    {"SPAudioDataType", nullptr},           {"SPBluetoothDataType", "30%\n"},
-    {"SPFireWireDataType", nullptr},        {"SPDisplaysDataType", "40%\n"},
-    {"SPMemoryDataType", nullptr},          {"SPPrintersDataType", "50%\n"},
-    {"SPSerialATADataType", nullptr},       {"SPParallelSCSIDataType", nullptr},
-    {"SPUSBDataType", "60%\n"},             {"SPAirPortDataType", nullptr},
-    {"SPFirewallDataType", "70%\n"},        {"SPNetworkLocationDataType", nullptr},
-    {"SPNetworkVolumeDataType", "80%\n"},   {"SPApplicationsDataType", nullptr},
-    {"SPStartupItemDataType", "90%\n"},     {"SPDiscBurningDataType", nullptr},
+    {"SPHardwareDataType", nullptr},      {"SPNetworkDataType", "10%\n"},
+    {"SPSoftwareDataType", nullptr},      {"SPParallelATADataType", "20%\n"},
+    {"SPAudioDataType", nullptr},         {"SPBluetoothDataType", "30%\n"},
+    {"SPFireWireDataType", nullptr},      {"SPDisplaysDataType", "40%\n"},
+    {"SPMemoryDataType", nullptr},        {"SPPrintersDataType", "50%\n"},
+    {"SPSerialATADataType", nullptr},     {"SPParallelSCSIDataType", nullptr},
+    {"SPUSBDataType", "60%\n"},           {"SPAirPortDataType", nullptr},
+    {"SPFirewallDataType", "70%\n"},      {"SPNetworkLocationDataType", nullptr},
+    {"SPNetworkVolumeDataType", "80%\n"}, {"SPApplicationsDataType", nullptr},
+    {"SPStartupItemDataType", "90%\n"},   {"SPDiscBurningDataType", nullptr},
     {"SPPowerDataType", nullptr},
 };
 

@@ -142,11 +142,12 @@ QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
   if (!speed.empty()) {
     double number = std::atof(firstWord(speed).c_str());
     // Old profilers print "2.26 GHz", very old ones "867 MHz".
-    facts.processor_speed = wholeNumber(speed.find("MHz") != std::string::npos ? number
-                                                                                : number * 1000);
+    facts.processor_speed =
+        wholeNumber(speed.find("MHz") != std::string::npos ? number : number * 1000);
   }
   facts.processor_model = stringAt(hardware, "cpu_type");
-  if (facts.processor_model.find("Intel") != std::string::npos) facts.processor_maker = "GenuineIntel";
+  if (facts.processor_model.find("Intel") != std::string::npos)
+    facts.processor_maker = "GenuineIntel";
   facts.machine_model = stringAt(hardware, "machine_model");
   facts.system_maker = "Apple Inc.";
   std::string memory = stringAt(hardware, "physical_memory");

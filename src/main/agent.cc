@@ -38,8 +38,8 @@ int runAgent(int argc, char** argv) {
   output.progress_log = settings.log ? 1 : 0;
 
   std::unique_ptr<ProcessTable> processes = makeSystemProcessTable();
-  ScanDriver driver(ScanTools{systemCommandRunner(), *processes, systemFileSystem(), readComputerName,
-                              stdout, stderr});
+  ScanDriver driver(ScanTools{systemCommandRunner(), *processes, systemFileSystem(),
+                              readComputerName, stdout, stderr});
   driver.run(output, settings.silent, settings.debug, settings.ip, settings.login);
   std::fflush(stdout);
   return 0;

@@ -78,8 +78,7 @@ void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::strin
   log(logging, "------Start Log------\n");
   log(logging, "I. Collecting Data....\n");
   std::vector<size_t> part_ends;
-  std::string document =
-      ProfilerCollector(tools_.runner).collect(logging, tools_.out, &part_ends);
+  std::string document = ProfilerCollector(tools_.runner).collect(logging, tools_.out, &part_ends);
   log(logging, "done\n");
 
   // A document that cannot be read leaves the trees without profiler data;
@@ -132,7 +131,8 @@ void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::strin
   asset.ip = ip;
   asset.login = login;
   asset.manual_ip = identity.manual;
-  std::unique_ptr<TagTree> asset_tree = buildAssetInfo(output.tree_flag, snapshot, date, facts, asset);
+  std::unique_ptr<TagTree> asset_tree =
+      buildAssetInfo(output.tree_flag, snapshot, date, facts, asset);
   log(logging, "done\n");
 
   SnapshotFile file(native);

@@ -31,8 +31,7 @@ bool hasKey(const Tag& item, std::string_view key);
 /// an empty value (the property is still created).
 void copyField(Tag& record, std::string_view field, const Tag& item, std::string_view key);
 /// Copy, but only when the key is present.
-void copyFieldIfPresent(Tag& record, std::string_view field, const Tag& item,
-                        std::string_view key);
+void copyFieldIfPresent(Tag& record, std::string_view field, const Tag& item, std::string_view key);
 
 /// "1" when `text` equals `yes` exactly, else "0".
 std::string flagText(std::string_view text, std::string_view yes);

@@ -24,10 +24,9 @@ class TagValue {
 
   TagValue() = default;
   explicit TagValue(bool b) : type_(Type::kBool), int_(b ? 1 : 0) {}
-  template <typename T,
-            std::enable_if_t<std::is_integral_v<T> && !std::is_same_v<T, bool> &&
-                                 !std::is_same_v<T, char>,
-                             int> = 0>
+  template <typename T, std::enable_if_t<std::is_integral_v<T> && !std::is_same_v<T, bool> &&
+                                             !std::is_same_v<T, char>,
+                                         int> = 0>
   TagValue(T i) : type_(Type::kInt), int_(static_cast<int64_t>(i)) {}
   TagValue(double d) : type_(Type::kReal), real_(d) {}
   /// A null pointer gives the empty text (type text, not none).
@@ -146,8 +145,7 @@ class Tag {
   /// A leading "/" steps into the first child. With both notes non-null the
   /// property's annotation `note_key` gets `note_text` (replaced or added).
   TagProperty& setPropertyByPath(std::string_view path, const TagValue& value,
-                                 const char* note_key = nullptr,
-                                 const char* note_text = nullptr);
+                                 const char* note_key = nullptr, const char* note_text = nullptr);
   /// Annotates the tag named by `path`. Creates nothing. After each
   /// intermediate segment the walk continues in that child's *first child*
   /// ("a/b" annotates the b found under the first child of a).
