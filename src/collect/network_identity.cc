@@ -6,18 +6,6 @@ namespace cvn {
 
 namespace {
 
-const PlistValue* findItems(const PlistValue& root, std::string_view data_type) {
-  if (!root.isArray()) return nullptr;
-  for (const PlistValue& element : root.array) {
-    if (!element.isDictionary()) continue;
-    const PlistValue* name = element.find("_dataType");
-    if (!name || !name->isString() || name->text != data_type) continue;
-    const PlistValue* items = element.find("_items");
-    return items && items->isArray() ? items : nullptr;
-  }
-  return nullptr;
-}
-
 const std::string* findString(const PlistValue& dictionary, std::string_view key) {
   const PlistValue* value = dictionary.find(key);
   return value && value->isString() ? &value->text : nullptr;
@@ -70,7 +58,7 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
   out->manual = false;
 
   std::string hardware_address;
-  const PlistValue* interfaces = findItems(root, "SPNetworkDataType");
+  const PlistValue* interfaces = findProfilerItems(root, "SPNetworkDataType");
   if (interfaces) {
     for (const PlistValue& item : interfaces->array) {
       if (!item.isDictionary()) continue;
@@ -90,7 +78,7 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
   // unknown (address 0.0.0.0, not manual); the ip setting stays empty.
   if (ip.empty() && hardware_address.empty()) out->manual = false;
 
-  const PlistValue* locations = findItems(root, "SPNetworkLocationDataType");
+  const PlistValue* locations = findProfilerItems(root, "SPNetworkLocationDataType");
   const PlistValue* services = nullptr;
   if (locations) {
     for (const PlistValue& location : locations->array) {

@@ -834,4 +834,16 @@ bool parsePlist(std::string_view document, PlistValue* out, std::string* warning
   return reader.read(document, out, warning);
 }
 
+const PlistValue* findProfilerItems(const PlistValue& root, std::string_view data_type) {
+  if (!root.isArray()) return nullptr;
+  for (const PlistValue& entry : root.array) {
+    if (!entry.isDictionary()) continue;
+    const PlistValue* type = entry.find("_dataType");
+    if (!type || !type->isString() || type->text != data_type) continue;
+    const PlistValue* items = entry.find("_items");
+    return items && items->isArray() ? items : nullptr;
+  }
+  return nullptr;
+}
+
 }  // namespace cvn

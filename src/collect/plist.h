@@ -50,6 +50,11 @@ struct PlistEntry {
 /// `warning`, when given, receives a description of the first problem.
 bool parsePlist(std::string_view document, PlistValue* out, std::string* warning = nullptr);
 
+/// In a profiler document (an array of one dictionary per data type): the
+/// "_items" array of the first dictionary whose "_dataType" is `data_type`.
+/// Null when there is none or the document has another shape.
+const PlistValue* findProfilerItems(const PlistValue& root, std::string_view data_type);
+
 }  // namespace cvn
 
 #endif  // CVN_COLLECT_PLIST_H_

@@ -104,18 +104,6 @@ void readDisks(const PlistValue& root, QuickFacts* facts) {
 
 }  // namespace
 
-const PlistValue* findProfilerItems(const PlistValue& root, std::string_view data_type) {
-  if (!root.isArray()) return nullptr;
-  for (const PlistValue& entry : root.array) {
-    if (!entry.isDictionary()) continue;
-    const PlistValue* type = entry.find("_dataType");
-    if (!type || !type->isString() || type->text != data_type) continue;
-    const PlistValue* items = entry.find("_items");
-    return items && items->isArray() ? items : nullptr;
-  }
-  return nullptr;
-}
-
 QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
   QuickFacts facts;
   const PlistValue* software = firstItem(root, "SPSoftwareDataType");

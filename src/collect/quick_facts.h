@@ -43,10 +43,6 @@ struct QuickFacts {
   std::string volume_free;
 };
 
-/// The "_items" array of the first dictionary whose "_dataType" is
-/// `data_type`; null when there is none.
-const PlistValue* findProfilerItems(const PlistValue& root, std::string_view data_type);
-
 /// `runner` asks ioreg for the platform UUID first.
 QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner);
 

@@ -36,6 +36,19 @@ bool fileExists(const std::string& path) {
   return true;
 }
 
+AssetIdentity assetIdentityOf(const NetworkIdentity& network, const std::string& computer_name,
+                              const std::string& ip, const std::string& login) {
+  AssetIdentity asset;
+  asset.workgroup = network.workgroup;
+  asset.computer_name = computer_name;
+  asset.netbios_name = network.netbios_name;
+  asset.mac_address = network.mac_address;
+  asset.ip = ip;
+  asset.login = login;
+  asset.manual_ip = network.manual;
+  return asset;
+}
+
 }  // namespace
 
 std::string chooseResultName(const std::string& directory, const std::string& host,
@@ -122,15 +135,8 @@ void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::strin
   snapshot.setValue("/ip-address", TagValue(ip));
 
   log(logging, "V. Creating AssetInfo Section....");
-  AssetIdentity asset;
-  asset.workgroup = identity.workgroup;
-  asset.computer_name = computer_name;
-  asset.netbios_name = identity.netbios_name;
-  asset.mac_address = identity.mac_address;
+  AssetIdentity asset = assetIdentityOf(identity, computer_name, ip, login);
   asset.serial_number = serial;
-  asset.ip = ip;
-  asset.login = login;
-  asset.manual_ip = identity.manual;
   std::unique_ptr<TagTree> asset_tree =
       buildAssetInfo(output.tree_flag, snapshot, date, facts, asset);
   log(logging, "done\n");
@@ -162,14 +168,7 @@ void ScanDriver::runDebug(const OutputSettings& output, bool silent, std::string
   SnapshotFile file(output.tree_flag != 0);
   std::string computer_name = tools_.computer_name ? tools_.computer_name() : std::string();
   std::string host = identity.netbios_name.empty() ? computer_name : identity.netbios_name;
-  AssetIdentity asset;
-  asset.workgroup = identity.workgroup;
-  asset.computer_name = computer_name;
-  asset.netbios_name = identity.netbios_name;
-  asset.mac_address = identity.mac_address;
-  asset.ip = ip;
-  asset.login = login;
-  asset.manual_ip = identity.manual;
+  AssetIdentity asset = assetIdentityOf(identity, computer_name, ip, login);
   addDebugAssetInfo(file, output.tree_flag, host, asset, document);
 
   OutputSettings quiet = output;
