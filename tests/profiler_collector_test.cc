@@ -102,18 +102,6 @@ TEST(ProfilerCollectorTest, ATypeThatPrintsNothingIsAskedAgain) {
   EXPECT_EQ(runner.commands_ran_.size(), 4u);
 }
 
-TEST(ProfilerCollectorTest, ProgressLinesFollowTheirSteps) {
-  FakeCommandRunner runner;
-  for (const char* type : kTypes) runner.answer(command(type), output(type));
-  std::FILE* out = tmpfile();
-  ProfilerCollector(runner).collect(true, out);
-  std::rewind(out);
-  char buf[256] = {0};
-  size_t n = std::fread(buf, 1, sizeof buf - 1, out);
-  std::fclose(out);
-  EXPECT_EQ(std::string(buf, n), "10%\n20%\n30%\n40%\n50%\n60%\n70%\n80%\n90%\n100%\n");
-}
-
 }  // namespace
 }  // namespace cvn
 

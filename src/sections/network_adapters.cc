@@ -52,14 +52,19 @@ void buildNetworkAdaptersSection(TagTree& snapshot, const TagTree& raw) {
     copyFieldIfPresent(record, "type", item, "type");
     copyJoinedList(record, "ip-address", item, "ip_address");
     copyJoinedList(record, "ip-subnet", item, "SubnetMasks");
+    // Real profilers keep the masks in the IPv4 settings, beside "Router";
+    // without this fallback the subnet would never reach the inventory.
+    const Tag* ipv4 = item.findChild("IPv4");
+    if (!record.findProperty("ip-subnet") && ipv4) {
+      copyJoinedList(record, "ip-subnet", *ipv4, "SubnetMasks");
+    }
     const Tag* ethernet = item.findChild("Ethernet");
     if (ethernet && hasKey(*ethernet, "MAC_Address")) {
       std::string mac = toDashedMacAddress(rawText(*ethernet, "MAC_Address"));
       record.setProperty("manuf-by-mac", TagValue(mac.substr(0, 8)));
       record.setProperty("mac-address", TagValue(mac));
     }
-    if (const Tag* ipv4 = item.findChild("IPv4"))
-      copyFieldIfPresent(record, "default-gateway", *ipv4, "Router");
+    if (ipv4) copyFieldIfPresent(record, "default-gateway", *ipv4, "Router");
   }
 }
 
