@@ -170,9 +170,22 @@ void BM_SerialiseAndSave(benchmark::State& state) {
   setCounters(state, doc.size());
 }
 
-BENCHMARK(BM_Parse)->Arg(2500)->Arg(5000)->Arg(10000)->Arg(20000)->Arg(40000)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_Convert)->Arg(2500)->Arg(5000)->Arg(10000)->Arg(20000)->Arg(40000)->Unit(benchmark::kMillisecond);
-BENCHMARK(BM_PostProcess)->Arg(2500)->Arg(5000)->Arg(10000)->Arg(20000)->Arg(40000)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_Parse)->Arg(2500)->Arg(5000)->Arg(10000)->Arg(20000)->Arg(40000)->Unit(
+    benchmark::kMillisecond);
+BENCHMARK(BM_Convert)
+    ->Arg(2500)
+    ->Arg(5000)
+    ->Arg(10000)
+    ->Arg(20000)
+    ->Arg(40000)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_PostProcess)
+    ->Arg(2500)
+    ->Arg(5000)
+    ->Arg(10000)
+    ->Arg(20000)
+    ->Arg(40000)
+    ->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_SerialiseAndSave)
     ->RangeMultiplier(2)
     ->Range(2500, 40000)
