@@ -7,49 +7,47 @@
 namespace cvn {
 namespace {
 
-// One SPNetworkDataType item; `addresses` is the inside of the address
-// array's first string, and empty parts are left out.
-std::string interface(std::string name, std::string addresses, std::string method = "",
-                      std::string mac = "") {
-  std::string out = "<dict><key>interface</key><string>" + name + "</string>";
-  if (!addresses.empty())
-    out += "<key>ip_address</key><array><string>" + addresses + "</string></array>";
-  if (!method.empty())
-    out += "<key>IPv4</key><dict><key>ConfigMethod</key><string>" + method + "</string></dict>";
-  if (!mac.empty())
-    out += "<key>Ethernet</key><dict><key>MAC Address</key><string>" + mac + "</string></dict>";
-  return out + "</dict>";
+// "<key>key</key><tag>value</tag>", or nothing when the value is empty.
+std::string entry(std::string key, std::string value, std::string tag = "string") {
+  return value.empty() ? "" : "<key>" + key + "</key><" + tag + ">" + value + "</" + tag + ">";
 }
 
-// One service of a location; no SMB dictionary when both names are empty.
+// One SPNetworkDataType item; `addresses` is the inside of the address
+// array's first string.
+std::string interface(std::string name, std::string addresses, std::string method = "",
+                      std::string mac = "") {
+  return "<dict>" + entry("interface", name) +
+         entry("ip_address", addresses.empty() ? "" : "<string>" + addresses + "</string>",
+               "array") +
+         entry("IPv4", entry("ConfigMethod", method), "dict") +
+         entry("Ethernet", entry("MAC Address", mac), "dict") + "</dict>";
+}
+
 std::string service(std::string hardware_address, std::string workgroup, std::string netbios) {
-  std::string smb;
-  if (!workgroup.empty()) smb += "<key>Workgroup</key><string>" + workgroup + "</string>";
-  if (!netbios.empty()) smb += "<key>NetBIOSName</key><string>" + netbios + "</string>";
   return "<dict><key>hardware_address</key><string>" + hardware_address + "</string>" +
-         (smb.empty() ? "" : "<key>SMB</key><dict>" + smb + "</dict>") + "</dict>";
+         entry("SMB", entry("Workgroup", workgroup) + entry("NetBIOSName", netbios), "dict") +
+         "</dict>";
 }
 
 // The inactive location knows en1 too but must not be read.
 std::string document(const std::string& interfaces, const std::string& services) {
-  return "<array><dict><key>_dataType</key><string>SPNetworkLocationDataType</string>"
-         "<key>_items</key><array><dict><key>spnetworklocation_isActive</key><string>no</string>"
-         "<key>spnetworklocation_services</key><array>" +
-         service("00:1b:63:aa:bb:cc", "INACTIVE", "Wrong") +
-         "</array></dict><dict><key>spnetworklocation_isActive</key><string>yes</string>"
-         "<key>spnetworklocation_services</key><array>" +
-         services +
-         "</array></dict></array></dict>"
-         "<dict><key>_dataType</key><string>SPNetworkDataType</string><key>_items</key><array>" +
-         interfaces + "</array></dict></array>";
+  std::string inactive = service("00:1b:63:aa:bb:cc", "INACTIVE", "Wrong");
+  return "<array><dict>" + entry("_dataType", "SPNetworkLocationDataType") +
+         entry("_items",
+               "<dict>" + entry("spnetworklocation_isActive", "no") +
+                   entry("spnetworklocation_services", inactive, "array") + "</dict><dict>" +
+                   entry("spnetworklocation_isActive", "yes") +
+                   entry("spnetworklocation_services", services, "array") + "</dict>",
+               "array") +
+         "</dict><dict>" + entry("_dataType", "SPNetworkDataType") +
+         entry("_items", interfaces, "array") + "</dict></array>";
 }
 
 TEST(NetworkIdentityTest, EdgeCases) {
-  const std::string en0 = interface("en0", "");
-  const std::string modem = interface("Bluetooth-Modem", "10.0.0.9");
+  // Neither can be chosen: not an "en" interface, or no address.
+  const std::string passed_over = interface("Bluetooth-Modem", "10.0.0.9") + interface("en0", "");
   const std::string en1 =
       interface("en1", "192.168.1.5</string><string>192.168.1.6", "Manual", "00:1b:63:aa:bb:cc");
-  const std::string en2 = interface("en2", "172.16.0.2", "DHCP");
   const std::string fw0 = interface("fw0", "169.254.1.1", "Manual", "0a:0b:0c:0d:0e:0f");
   // Services of other interfaces and without a workgroup are passed over.
   const std::string services =
@@ -63,10 +61,11 @@ TEST(NetworkIdentityTest, EdgeCases) {
     const char* expected;  // "ip|workgroup|length|mac|netbios|manual"
   } cases[] = {
       // Non-ASCII stays as it is; the length counts UTF-16 units.
-      {document(modem + en0 + en1, services), "",
+      {document(passed_over + en1, services), "",
        "192.168.1.5|GR\xC3\xBCPPE\xF0\x9F\x98\x80|8|00-1B-63-AA-BB-CC|MyMac|manual"},
-      {document(en2 + en1, services), "", "172.16.0.2||0|kept||auto"},
-      {document(modem + en0 + fw0, services), "", "||0|kept||auto"},
+      {document(interface("en2", "172.16.0.2", "DHCP") + en1, services), "",
+       "172.16.0.2||0|kept||auto"},
+      {document(passed_over + fw0, services), "", "||0|kept||auto"},
       {document(en1 + fw0, services), "169.254.1.1",
        "169.254.1.1|FW|2|0A-0B-0C-0D-0E-0F|FW|manual"},
       {document(en1, services), "192.168.1.6", "192.168.1.6||0|kept||auto"},
@@ -85,9 +84,7 @@ TEST(NetworkIdentityTest, EdgeCases) {
   for (const auto& c : cases) {
     PlistValue root;
     ASSERT_TRUE(parsePlist(c.xml, &root));
-    NetworkIdentity out;
-    out.mac_address = "kept";
-    out.manual = true;
+    NetworkIdentity out{"", 0, "kept", "", true};
     std::string ip = c.ip;
     EXPECT_EQ(readNetworkIdentity(root, ip, &out), out.workgroup);
     EXPECT_EQ(ip + "|" + out.workgroup + "|" + std::to_string(out.workgroup_length) + "|" +

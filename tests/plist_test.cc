@@ -8,28 +8,29 @@
 namespace cvn {
 namespace {
 
-// The value with its kind visible: s"text" (bytes outside printable ASCII as
-// \xNN), i5, r1.50, d<epoch seconds>, b1, x<hex data>, [a,b], {key:value}.
+// The value with its kind visible: s"text" and x"data" (bytes outside
+// printable ASCII as \xNN), i5, r1.50, d<epoch seconds>, b1, [a,b], {key:value}.
 std::string plistText(const PlistValue& v) {
   using Kind = PlistValue::Kind;
   std::string out;
   char buf[16];
   for (unsigned char c : v.text) {
-    bool plain = v.kind == Kind::kString && c >= 0x20 && c < 0x7F;
-    std::snprintf(buf, sizeof buf, v.kind == Kind::kString ? "\\x%02X" : "%02X", c);
-    out += plain ? std::string(1, static_cast<char>(c)) : std::string(buf);
+    std::snprintf(buf, sizeof buf, c >= 0x20 && c < 0x7F ? "%c" : "\\x%02X", c);
+    out += buf;
   }
   for (const PlistValue& e : v.array) out += "," + plistText(e);
   for (const PlistEntry& e : v.dictionary) out += "," + e.key + ":" + plistText(e.value);
-  std::snprintf(buf, sizeof buf, "r%.2f", v.real);
   std::string items = out.substr(out.empty() ? 0 : 1);
-  if (v.kind == Kind::kString) return "s\"" + out + "\"";
-  if (v.kind == Kind::kData) return "x" + out;
-  if (v.kind == Kind::kReal) return buf;
+  std::snprintf(buf, sizeof buf, "%.2f", v.real);
+  if (v.kind == Kind::kString || v.kind == Kind::kData)
+    return (v.kind == Kind::kString ? "s\"" : "x\"") + out + "\"";
   if (v.isArray()) return "[" + items + "]";
   if (v.isDictionary()) return "{" + items + "}";
-  const char* mark = v.kind == Kind::kInteger ? "i" : v.kind == Kind::kDate ? "d" : "b";
-  return mark + std::to_string(v.integer);
+  if (v.kind == Kind::kReal) return std::string("r") + buf;
+  return (v.kind == Kind::kInteger ? "i"
+          : v.kind == Kind::kDate  ? "d"
+                                   : "b") +
+         std::to_string(v.integer);
 }
 
 // The rendering of `document`, or "false" when the reader gives up.
@@ -46,16 +47,13 @@ TEST(PlistTest, ValueKinds) {
     const char* expected;
   } cases[] = {{"<integer> \t\n42</integer>", "i42"},
                {"<integer>0x1F</integer>", "i31"},
-               {"<integer>-0x10</integer>", "i-16"},
                {"<integer>-9223372036854775808</integer>", "i-9223372036854775808"},
                {"<integer>9223372036854775808</integer>", "i-9223372036854775808"},
                {"<integer>18446744073709551615</integer>", "i-1"},
                {"<integer>18446744073709551616</integer>", ""},
                {"<integer>-9223372036854775809</integer>", ""},
                {"<integer>5 </integer>", ""},
-               {"<integer>1a</integer>", ""},
                {"<integer/>", ""},
-               {"<real>.5</real>", "r0.50"},
                {"<real> +1E2</real>", "r100.00"},
                {"<real>-INF</real>", "r-inf"},
                {"<real>1.5 </real>", ""},
@@ -64,11 +62,10 @@ TEST(PlistTest, ValueKinds) {
                {"<date>2000-02-29T00:00:00Z</date>", "d951782400"},
                {"<date>2013-13-01T00:00:00Z</date>", "d1388534400"},  // converted, not checked
                {"<date>2013-11-15T20:30:00</date>", ""},
-               {"<data>aGVs\nbG8=</data>", "x68656C6C6F"},
-               {"<data></data>", "x"},
+               {"<data>aGVs\nbG8=</data>", "x\"hello\""},
+               {"<data></data>", "x\"\""},
                {"<data/>", ""},
                {"<data>\xC3\xA9</data>", ""},
-               {"<false/>", "b0"},
                {"<blob>x</blob>", ""},
                {"<string>a<b/>c</string>", ""},
                {"<string> &lt;&amp;&apos;&quot;&#65;&#xE9;</string>", "s\" <&'\"A\\xC3\\xA9\""},
@@ -81,7 +78,6 @@ TEST(PlistTest, ValueKinds) {
                {"<string>\xFF\xC3(\xED\xA0\x80</string>", "s\"\\xFF\\xC3(\\xED\\xA0\\x80\""},
                {"<string>\xEF\x9C\x80&#xF701;</string>", "s\"\\xEF\\x9C\\x80\\xEF\\x9C\\x81\""},
                {"<string>&nbsp;</string>", ""},
-               {"<string>AT&T</string>", ""},
                {"<string>&#xD800;</string>", ""}};
   for (const auto& c : cases) {
     std::string v = *c.expected ? std::string("v:") + c.expected + "," : "";
@@ -93,20 +89,26 @@ TEST(PlistTest, ValueKinds) {
 }
 
 TEST(PlistTest, OddDocuments) {
+  // Nesting is limited (the innermost of 256 arrays stays empty), and far
+  // deeper input neither recurses nor exhausts anything.
+  std::string deep, hostile, hostile_text;
+  for (int i = 0; i < 300; ++i) deep += "<array>";
+  for (int i = 0; i < 200000; ++i) hostile += "<dict><key>k</key>";
+  for (int i = 0; i < 255; ++i) hostile_text += "{k:";
   struct {
     std::string document;
-    const char* expected;
+    std::string expected;
   } cases[] = {
+      {deep + "<string>x</string>", std::string(256, '[') + std::string(256, ']')},
+      {hostile, hostile_text + "{}" + std::string(255, '}')},
       // Breaks keep what was read, and the reader fails only without any value.
       {"<array><dict><key>a</key><string>x</string><key>b</key><string>cut", "[{a:s\"x\"}]"},
       {"<array><string>x</string><dict><key>a</key><integer>1</integer></strin><string>y",
        "[s\"x\",{a:i1}]"},
-      {"<array><string>x</string></array></plist>trailing & junk <", "[s\"x\"]"},
       {"<array><string>x", "[]"},
       {"", "false"},
       {"{ a = b; }", "false"},
       {"<plist/>", "false"},
-      {"<html><body>x</body></html>", "false"},
       {"<!DOCTYPE plist [<!ENTITY e \"x\">]><plist><string>&e;</string>", "false"},
       // A key without a value, a value without a key, a repeated key.
       {"<dict><key>a</key><key>b</key><integer>2</integer><string>lost</string></dict>", "{b:i2}"},
@@ -114,21 +116,7 @@ TEST(PlistTest, OddDocuments) {
       {"<?xml version=\"1.0\"?>\r\n<!-- \x01 -->\r\n<?pi x?><dict><key>k\x01\r</key><true/></dict>",
        "{k\x01\r:b1}"},
   };
-  for (const auto& c : cases) EXPECT_EQ(parsed(c.document), c.expected) << c.document;
-}
-
-TEST(PlistTest, NestingIsLimited) {
-  std::string deep;
-  for (int i = 0; i < 300; ++i) deep += "<array>";
-  PlistValue value;
-  ASSERT_TRUE(parsePlist(deep + "<string>bottom</string>", &value));
-  int depth = 0;
-  for (const PlistValue* v = &value; !v->array.empty(); v = &v->array.front()) ++depth;
-  EXPECT_EQ(depth, 255);  // 256 arrays, the innermost one empty
-  // Far deeper input neither recurses nor exhausts anything.
-  std::string hostile;
-  for (int i = 0; i < 200000; ++i) hostile += "<dict><key>k</key>";
-  EXPECT_TRUE(parsePlist(hostile, &value));
+  for (const auto& c : cases) EXPECT_EQ(parsed(c.document), c.expected) << c.document.substr(0, 99);
 }
 
 }  // namespace
