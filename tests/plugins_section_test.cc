@@ -1,156 +1,109 @@
 #include <gtest/gtest.h>
 
+#include <initializer_list>
+#include <map>
+#include <set>
 #include <string>
 #include <utility>
 #include <vector>
 
+#include "collect/file_system.h"
 #include "fake_command_runner.h"
-#include "fake_file_system.h"
 #include "sections/sections.h"
 #include "tree_text.h"
 
 namespace cvn {
 namespace {
 
-std::string infoPlist(const std::vector<std::pair<std::string, std::string>>& strings) {
-  std::string xml =
-      "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
-      "<!DOCTYPE plist PUBLIC \"-//Apple//DTD PLIST 1.0//EN\" "
-      "\"http://www.apple.com/DTDs/PropertyList-1.0.dtd\">\n"
-      "<plist version=\"1.0\">\n<dict>\n";
-  for (const auto& [key, value] : strings)
-    xml += "\t<key>" + key + "</key>\n\t<string>" + value + "</string>\n";
-  return xml + "\t<key>CFBundleSignature</key>\n\t<integer>7</integer>\n</dict>\n</plist>\n";
-}
-
-class PlugInsSectionTest : public ::testing::Test {
- protected:
-  std::string build() {
-    buildPlugInsSection(snapshot_, fs_, runner_);
-    return treeText(snapshot_.top().findChild("Software"));
+// Files by path; a folder is any path that something lies below, so "F/"
+// alone makes an empty folder F.
+class FakeFileSystem : public FileSystem {
+ public:
+  std::vector<std::string> listDirectory(const std::string& path) override {
+    std::set<std::string> names;
+    for (const auto& file : files_) {
+      if (file.first.compare(0, path.size() + 1, path + "/") != 0) continue;
+      std::string rest = file.first.substr(path.size() + 1);
+      if (!rest.empty()) names.insert(rest.substr(0, rest.find('/')));
+    }
+    return std::vector<std::string>(names.begin(), names.end());
   }
-
-  TagTree snapshot_{true, "Snapshot"};
-  FakeFileSystem fs_;
-  FakeCommandRunner runner_;
+  bool isDirectory(const std::string& path) override {
+    auto below = files_.lower_bound(path + "/");
+    return below != files_.end() && below->first.compare(0, path.size() + 1, path + "/") == 0;
+  }
+  bool readFile(const std::string& path, size_t max_bytes, std::string* out) override {
+    auto it = files_.find(path);
+    *out = it == files_.end() ? "" : it->second.substr(0, max_bytes);
+    return it != files_.end();
+  }
+  std::map<std::string, std::string> files_;
 };
 
-TEST_F(PlugInsSectionTest, MissingFoldersGiveEmptyGroups) {
-  EXPECT_EQ(build(), "+Software=\n*InternetPlug-Ins=\n*Libraries=\n-\n");
-  EXPECT_TRUE(runner_.commands_ran_.empty());
+std::string infoPlist(std::initializer_list<std::pair<const char*, const char*>> strings,
+                      const std::string& more = "") {
+  std::string xml = "<plist version=\"1.0\"><dict>";
+  for (const auto& [key, value] : strings)
+    xml += std::string("<key>") + key + "</key><string>" + value + "</string>";
+  return xml + more + "</dict></plist>";
 }
 
-TEST_F(PlugInsSectionTest, RecordsEveryBundleOfTheMachineAndItsUsers) {
+TEST(PlugInsSectionTest, RecordsEveryBundleOfTheMachineAndItsUsers) {
+  FakeFileSystem fs;
+  FakeCommandRunner runner;
+  auto build = [&] {
+    TagTree snapshot(true, "Snapshot");
+    buildPlugInsSection(snapshot, fs, runner);
+    return treeText(snapshot.top().findChild("Software"));
+  };
+  EXPECT_EQ(build(), "+Software=\n*InternetPlug-Ins=\n*Libraries=\n-\n");
+
   const std::string global = "/Library/Internet Plug-Ins";
-  fs_.addFile(global + "/Flash Player.plugin/Contents/Info.plist",
-              infoPlist({{"CFBundleName", "Shockwave Flash"},
-                         {"CFBundleShortVersionString", "11.9.900.152"},
-                         {"CFBundleVersion", "11.9.900"},
-                         {"WebPluginDescription", "Shockwave Flash 11.9 r900"},
-                         {"CFBundleGetInfoString", "Copyright Adobe"}}));
-  // Binary lists are converted by plutil.
-  const std::string quicktime = global + "/QuickTime Plugin.plugin/Contents/Info.plist";
-  fs_.addFile(quicktime, std::string("bplist00\xd1\x01\x02", 11));
-  runner_.answer("plutil -convert xml1 -o - \"" + quicktime + "\"",
-                 infoPlist({{"CFBundleVersion", "7.7.3"},
-                            {"CFBundleGetInfoString", "QuickTime Plug-in 7.7.3"}}));
-  // No Info.plist, a damaged one, and things that are not bundles.
-  fs_.addDirectory(global + "/Bare.webplugin");
-  fs_.addFile(global + "/Damaged.plugin/Contents/Info.plist", "<plist><dict><key>CFBundleN");
-  fs_.addFile(global + "/.DS_Store", "x");
-  fs_.addFile(global + "/README.txt", "x");
-  // A user's own plug-ins; the path reaches plutil escaped.
+  // A binary list that plutil cannot read still leaves the bundle.
+  fs.files_[global + "/Broken.plugin/Contents/Info.plist"] = "bplist00";
+  fs.files_[global + "/.Hidden.plugin/"] = "";
+  fs.files_[global + "/README.txt"] = "";
   const std::string odd = "/Users/alice/Library/Internet Plug-Ins/O\"dd$(x).plugin";
-  fs_.addFile(odd + "/Contents/Info.plist", "bplist00");
-  runner_.answer(
+  fs.files_[odd + "/Contents/Info.plist"] = std::string("bplist00\xd1\x01\x02", 11);
+  runner.answer(
       "plutil -convert xml1 -o - \"/Users/alice/Library/Internet Plug-Ins/"
       "O\\\"dd\\$(x).plugin/Contents/Info.plist\"",
-      infoPlist({{"CFBundleName", "Odd"}}));
-  fs_.addDirectory("/Users/Shared");
-  fs_.addFile("/Users/.localized", "");
-  fs_.addDirectory("/Users/.hidden/Library/Internet Plug-Ins/Hidden.plugin");
-  // Frameworks, with the plist in each of the places it is looked for.
-  const std::string frameworks = "/Library/Frameworks";
-  fs_.addFile(frameworks + "/Mono.framework/Resources/Info.plist",
-              infoPlist({{"CFBundleName", "Mono"}, {"CFBundleVersion", "3.2.5"}}));
-  fs_.addFile(frameworks + "/Python.framework/Versions/Current/Resources/Info.plist",
-              infoPlist({{"CFBundleShortVersionString", "2.7"},
-                         {"CFBundleGetInfoString", "Python Runtime"}}));
-  fs_.addFile(frameworks + "/Growl.framework/Contents/Info.plist",
-              infoPlist({{"CFBundleName", ""}, {"CFBundleShortVersionString", "1.3"}}));
-  fs_.addFile(frameworks + "/notes.framework", "a file");
-  fs_.addDirectory(frameworks + "/Headers");
+      infoPlist({{"CFBundleShortVersionString", "7.7"},
+                 {"CFBundleVersion", "7.7.3"},
+                 {"WebPluginDescription", "Odd 7.7"},
+                 {"CFBundleGetInfoString", "Copyright"}}));
+  fs.files_["/Users/Shared/"] = "";
+  fs.files_["/Users/.hidden/Library/Internet Plug-Ins/Hidden.plugin/"] = "";
+  fs.files_["/Library/Frameworks/Headers/"] = "";
+  fs.files_["/Library/Frameworks/Python.framework/Versions/Current/Resources/Info.plist"] =
+      infoPlist({{"CFBundleVersion", "2.7"}}, "<key>CFBundleName</key><integer>7</integer>");
 
-  EXPECT_EQ(build(), R"(+Software=
+  EXPECT_EQ(build(), R"x(+Software=
 +InternetPlug-Ins=
 plugin:1=""
 ~complex=
 plugin:2=""
 ~complex=
-plugin:3=""
-~complex=
-plugin:4=""
-~complex=
-plugin:5=""
-~complex=
 *plugin:1=
-name="Bare"
-location="/Library/Internet Plug-Ins/Bare.webplugin"
+name="Broken"
+location="/Library/Internet Plug-Ins/Broken.plugin"
 *plugin:2=
-name="Damaged"
-location="/Library/Internet Plug-Ins/Damaged.plugin"
-*plugin:3=
-name="Shockwave Flash"
-version="11.9.900.152"
-location="/Library/Internet Plug-Ins/Flash Player.plugin"
-description="Shockwave Flash 11.9 r900"
-*plugin:4=
-name="QuickTime Plugin"
-version="7.7.3"
-location="/Library/Internet Plug-Ins/QuickTime Plugin.plugin"
-description="QuickTime Plug-in 7.7.3"
-*plugin:5=
-name="Odd"
+name="O"dd$(x)"
+version="7.7"
 location="/Users/alice/Library/Internet Plug-Ins/O"dd$(x).plugin"
+description="Odd 7.7"
 -
 +Libraries=
 library:1=""
 ~complex=
-library:2=""
-~complex=
-library:3=""
-~complex=
 *library:1=
-name="Growl"
-version="1.3"
-location="/Library/Frameworks/Growl.framework"
-*library:2=
-name="Mono"
-version="3.2.5"
-location="/Library/Frameworks/Mono.framework"
-*library:3=
 name="Python"
 version="2.7"
 location="/Library/Frameworks/Python.framework"
 -
 -
-)");
-  EXPECT_EQ(runner_.commands_ran_.size(), 2u);
-}
-
-TEST_F(PlugInsSectionTest, BinaryListThatPlutilCannotReadKeepsTheBundle) {
-  fs_.addFile("/Library/Internet Plug-Ins/X.plugin/Contents/Info.plist", "bplist00");
-  EXPECT_EQ(build(), R"(+Software=
-+InternetPlug-Ins=
-plugin:1=""
-~complex=
-*plugin:1=
-name="X"
-location="/Library/Internet Plug-Ins/X.plugin"
--
-*Libraries=
--
-)");
+)x");
+  EXPECT_EQ(runner.commands_ran_.size(), 2u);
 }
 
 }  // namespace
