@@ -1,6 +1,7 @@
 #include "zxml/size_text.h"
 
 #include <cctype>
+#include <cmath>
 #include <cstdarg>
 #include <cstdio>
 #include <cstdlib>
@@ -23,6 +24,9 @@ ParsedSize parseSize(std::string_view text) {
   copy.resize(copy.size() - 3);
   // "%lf" semantics: leading blanks skipped, the longest numeric prefix read.
   if (std::sscanf(copy.c_str(), "%lf", &parsed.number) != 1) parsed.number = 0.0;
+  // "%lf" also reads "nan" and "inf"; no size of a real device is either,
+  // and neither may reach the inventory as a number.
+  if (!std::isfinite(parsed.number)) parsed.number = 0.0;
   return parsed;
 }
 
