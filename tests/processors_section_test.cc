@@ -1,6 +1,9 @@
 #include <gtest/gtest.h>
 
+#include <sstream>
 #include <string>
+#include <utility>
+#include <vector>
 
 #include "sections/sections.h"
 #include "tree_text.h"
@@ -9,29 +12,30 @@
 namespace cvn {
 namespace {
 
-class ProcessorsSectionTest : public ::testing::Test {
- protected:
-  std::string build() {
-    buildProcessorsSection(snapshot_, raw_);
-    return treeText(snapshot_.top().findChild("Processors"));
-  }
-  void set(const std::string& key, const TagValue& value) {
-    raw_.setValue("/SPHardwareDataType/_items/item0/" + key, value);
-  }
+using Keys = std::vector<std::pair<const char*, TagValue>>;
 
-  TagTree raw_{true, "Macintosh"};
-  TagTree snapshot_{true, "Snapshot"};
-};
+// The whole section, or with `first_only` the values of the first processor.
+std::string buildProcessors(const Keys& keys, bool first_only = false) {
+  TagTree raw(true, "Macintosh"), snapshot(true, "Snapshot");
+  for (const auto& [key, value] : keys)
+    raw.setValue(std::string("/SPHardwareDataType/_items/item0/") + key, value);
+  buildProcessorsSection(snapshot, raw);
+  const Tag* section = snapshot.top().findChild("Processors");
+  if (!first_only || !section) return treeText(section);
+  std::istringstream lines(treeText(section->findChild("Processor:1")));
+  std::string line, values;
+  while (std::getline(lines, line)) values += line.substr(line.find('=') + 1) + " ";
+  return values;
+}
 
-TEST_F(ProcessorsSectionTest, PerCoreCacheIsMultipliedThenSpreadOverPackages) {
-  set("packages", TagValue(int64_t{2}));
-  set("cpu_type", TagValue("Quad-Core Intel Xeon"));
-  set("number_processors", TagValue(int64_t{8}));
-  set("number_cpus", TagValue(int64_t{99}));
-  set("l2_cache_core", TagValue("256 KB"));
-  set("l3_cache", TagValue("8 MB"));
-  set("current_processor_speed", TagValue("2.66 GHz"));
-  EXPECT_EQ(build(), R"txt(+Processors=
+TEST(ProcessorsSectionTest, PerCoreCacheIsMultipliedThenSpreadOverPackages) {
+  EXPECT_EQ(buildProcessors({{"packages", 2},
+                             {"cpu_type", "Quad-Core Intel Xeon"},
+                             {"number_processors", 8},
+                             {"l2_cache_core", "256 KB"},
+                             {"l3_cache", "8 MB"},
+                             {"current_processor_speed", "2.66 GHz"}}),
+            R"txt(+Processors=
 *Processor:1="Quad-Core Intel Xeon"
 core-count=8
 l2-cache-size=1024
@@ -46,62 +50,23 @@ current-clock-speed=2660
 )txt");
 }
 
-TEST_F(ProcessorsSectionTest, WithoutPackagesOneUndividedProcessor) {
-  set("number_cpus", TagValue(int64_t{2}));
-  set("l2_cache", TagValue("6 MB"));
-  set("l3_cache_size", TagValue("3 MB"));
-  set("current_processor_speed", TagValue("2,01 GHz"));
-  EXPECT_EQ(build(), R"txt(+Processors=
-*Processor:1="CPU #1"
-core-count=2
-l2-cache-size=6144
-l3-cache-size=6144
-current-clock-speed=2010
--
-)txt");
-}
-
-TEST_F(ProcessorsSectionTest, WrongKindsReadAsEmptyOrZero) {
-  set("cpu_type", TagValue(int64_t{7}));
-  set("number_processors", TagValue("4"));
-  set("l2_cache_core", TagValue(int64_t{256}));
-  set("current_processor_speed", TagValue(2.5));
-  EXPECT_EQ(build(), R"txt(+Processors=
-*Processor:1=7
-core-count=0
-l2-cache-size=0
-l3-cache-size=0
--
-)txt");
-}
-
-TEST_F(ProcessorsSectionTest, WholeCacheUsesIntegerDivision) {
-  set("packages", TagValue(int64_t{3}));
-  set("l2_cache", TagValue("1 MB"));
-  set("current_processor_speed", TagValue("fast"));
-  std::string text = build();
-  EXPECT_NE(text.find("*Processor:3=\"CPU #3\"\ncore-count=1\nl2-cache-size=341\n"),
-            std::string::npos)
-      << text;
-  EXPECT_NE(text.find("current-clock-speed=0\n"), std::string::npos) << text;
-}
-
-TEST_F(ProcessorsSectionTest, UnusablePackageCountsWriteNothing) {
-  const TagValue bad[] = {TagValue("2"), TagValue(int64_t{0}), TagValue(int64_t{-1}), TagValue(1.0),
-                          TagValue(int64_t{1} << 40)};
-  for (const TagValue& packages : bad) {
-    TagTree raw(true, "Macintosh");
-    raw.setValue("/SPHardwareDataType/_items/item0/packages", packages);
-    raw.setValue("/SPHardwareDataType/_items/item0/cpu_type", TagValue("Intel Core 2 Duo"));
-    TagTree snapshot(true, "Snapshot");
-    buildProcessorsSection(snapshot, raw);
-    EXPECT_EQ(snapshot.top().findChild("Processors"), nullptr) << packages.textForm();
-  }
-}
-
-TEST_F(ProcessorsSectionTest, NoHardwareNoSection) {
-  raw_.setValue("/SPSoftwareDataType/_items/item0/os_version", TagValue("Mac OS X 10.6.8"));
-  EXPECT_EQ(build(), "");
+TEST(ProcessorsSectionTest, PackageCoreAndCacheRules) {
+  // Values: name, cores, L2 KB, L3 KB, MHz.
+  const std::pair<Keys, const char*> cases[] = {
+      // Without "packages" one processor; a per-size cache counts per core.
+      {{{"number_cpus", 2}, {"l2_cache", "6 MB"}, {"l3_cache_size", "3 MB"}},
+       "\"CPU #1\" 2 6144 6144 "},
+      // A whole-machine cache is divided as an integer; no core count is one.
+      {{{"packages", 3}, {"l2_cache", "1 MB"}, {"current_processor_speed", "2,01 GHz"}},
+       "\"CPU #1\" 1 341 0 2010 "},
+      {{{"cpu_type", 7}, {"number_processors", "4"}, {"current_processor_speed", 2.5}}, "7 0 0 0 "},
+  };
+  for (const auto& [keys, expected] : cases)
+    EXPECT_EQ(buildProcessors(keys, true), expected) << keys.front().first;
+  // Unusable package counts write nothing.
+  for (const TagValue& packages :
+       {TagValue("2"), TagValue(0), TagValue(-1), TagValue(1.0), TagValue(int64_t{1} << 40)})
+    EXPECT_EQ(buildProcessors({{"packages", packages}}), "") << packages.textForm();
 }
 
 }  // namespace
