@@ -101,20 +101,5 @@ TEST(CommandLineTest, ConsentAcceptsOnlyLowerCaseYAndN) {
   }
 }
 
-TEST(CommandLineTest, HelpOmitsTheHiddenOptions) {
-  std::FILE* out = tmpfile();
-  printHelp(out);
-  std::rewind(out);
-  std::string text(4096, '\0');
-  text.resize(std::fread(&text[0], 1, text.size(), out));
-  std::fclose(out);
-  EXPECT_NE(text.find("Corvane's Mac OS X Agent\nUsage: cvnmacagent [OPTION...]\n"
-                      "-ip:[ipaddr],\t\t/ip:[ipaddr]\t\tSet Current IP Address\n"
-                      "--help,\t\t\t-?\t\t\tShow this help message\n"),
-            std::string::npos);
-  EXPECT_NE(text.find("\n\n\nFor additional information contact us: "), std::string::npos);
-  EXPECT_EQ(text.find("-log"), std::string::npos);
-}
-
 }  // namespace
 }  // namespace cvn

@@ -39,7 +39,9 @@ TEST(CorpusScanTest, EveryRecordedMacGivesAReadableResultFile) {
     SCOPED_TRACE(entry.path().string());
 
     PlistValue plist;
-    ASSERT_TRUE(parsePlist(text, &plist));
+    std::string warning;
+    ASSERT_TRUE(parsePlist(text, &plist, &warning));
+    EXPECT_EQ(warning, "") << "real profiler output must read without a problem";
     FakeCommandRunner runner;
     runner.answer("ls -1 /Users/", "jane\n");
     QuickFacts facts = readQuickFacts(plist, runner);
