@@ -132,6 +132,9 @@ void BM_Convert(benchmark::State& state) {
     benchmark::DoNotOptimize(raw);
   }
   setCounters(state, doc.size());
+  TagTree kept(true, "Macintosh");
+  PlistConverter(kept).convertPlist(plist);
+  state.counters["heap_MB"] = heapMegabytes();
 }
 
 void BM_PostProcess(benchmark::State& state) {
@@ -187,8 +190,11 @@ BENCHMARK(BM_PostProcess)
     ->Arg(40000)
     ->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_SerialiseAndSave)
-    ->RangeMultiplier(2)
-    ->Range(2500, 40000)
+    ->Arg(2500)
+    ->Arg(5000)
+    ->Arg(10000)
+    ->Arg(20000)
+    ->Arg(40000)
     ->Unit(benchmark::kMillisecond);
 
 }  // namespace
