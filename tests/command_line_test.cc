@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
 #include <string>
 
 namespace cvn {
@@ -58,46 +57,6 @@ TEST(CommandLineTest, OptionsAreMatchedExactlyInOrder) {
     EXPECT_EQ(s.ip, c.ip) << where;
     EXPECT_EQ(s.login, c.login) << where;
     EXPECT_EQ(silenced, c.silenced) << where;
-  }
-}
-
-std::string consent(const std::string& input, ConsentAnswer* answer) {
-  std::FILE* in = tmpfile();
-  std::FILE* out = tmpfile();
-  std::fwrite(input.data(), 1, input.size(), in);
-  std::rewind(in);
-  *answer = askConsent(in, out);
-  std::rewind(out);
-  std::string text;
-  char buf[256];
-  size_t n;
-  while ((n = std::fread(buf, 1, sizeof buf, out)) > 0) text.append(buf, n);
-  std::fclose(in);
-  std::fclose(out);
-  return text;
-}
-
-TEST(CommandLineTest, ConsentAcceptsOnlyLowerCaseYAndN) {
-  const std::string prompt =
-      "Corvane scanner for MacOS X\nDo you want to start the scan of local computer?(y/n)\n";
-  const struct {
-    std::string input;
-    ConsentAnswer answer;
-    std::string line;
-  } cases[] = {
-      {"y\n", ConsentAnswer::kYes, "Scan started...\n"},
-      {"  y  trailing words\n", ConsentAnswer::kYes, "Scan started...\n"},
-      {"n\n", ConsentAnswer::kNo, "Scan canceled.\n"},
-      {"Y\n", ConsentAnswer::kInvalid, "Incorrect input. Application terminated.\n"},
-      {"yes\n", ConsentAnswer::kInvalid, "Incorrect input. Application terminated.\n"},
-      {"", ConsentAnswer::kInvalid, "Incorrect input. Application terminated.\n"},
-      {std::string(500, 'y'), ConsentAnswer::kInvalid,
-       "Incorrect input. Application terminated.\n"},
-  };
-  for (const auto& c : cases) {
-    ConsentAnswer answer;
-    EXPECT_EQ(consent(c.input, &answer), prompt + c.line) << c.input.substr(0, 20);
-    EXPECT_EQ(answer, c.answer) << c.input.substr(0, 20);
   }
 }
 

@@ -148,17 +148,18 @@ TEST_F(EndToEndTest, LogShowsEveryStageInOrder) {
 
 TEST_F(EndToEndTest, ConsentDecidesWhetherToScan) {
   const struct {
-    const char* input;
+    std::string input;
     int exit_code;
     const char* last_line;
   } cases[] = {
       {"n\n", 0, "Scan canceled.\n"},
       {"Y\n", 1, "Incorrect input. Application terminated.\n"},
+      {std::string(500, 'y'), 1, "Incorrect input. Application terminated.\n"},
       {"", 1, "Incorrect input. Application terminated.\n"},
   };
   for (const auto& c : cases) {
     AgentRun r = run({}, c.input);
-    EXPECT_EQ(r.exit_code, c.exit_code) << c.input;
+    EXPECT_EQ(r.exit_code, c.exit_code) << c.input.substr(0, 10);
     EXPECT_EQ(r.out,
               std::string("Corvane scanner for MacOS X\nDo you want to start the scan of local "
                           "computer?(y/n)\n") +

@@ -1,7 +1,6 @@
 #include "collect/process_table.h"
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include "fake_command_runner.h"
 #include "tree_text.h"
@@ -61,20 +60,6 @@ TEST(ProcessCollectorTest, AnUnreadableTableLeavesNoSection) {
   TagTree raw(true, "Macintosh");
   collectProcesses(raw, table, runner);
   EXPECT_EQ(raw.top().findChild("Processes"), nullptr);
-}
-
-TEST(ProcessTableTest, SystemTableListsThisProcess) {
-  std::vector<ProcessEntry> entries;
-  ASSERT_TRUE(makeSystemProcessTable()->read(&entries));
-  bool found = false;
-  for (const ProcessEntry& e : entries) {
-    if (e.pid == getpid()) {
-      found = true;
-      EXPECT_EQ(e.ppid, getppid());
-      EXPECT_FALSE(e.short_name.empty());
-    }
-  }
-  EXPECT_TRUE(found);
 }
 
 }  // namespace

@@ -94,14 +94,6 @@ TEST(ProfilerCollectorTest, TrimModesCutByByteCount) {
   EXPECT_EQ(collector.runProfiler("B", ProfilerCollector::Trim::kMiddle), "x");
 }
 
-TEST(ProfilerCollectorTest, ATypeThatPrintsNothingIsAskedAgain) {
-  SlowRunner runner;
-  runner.answer(command("A"), output("A"));
-  EXPECT_EQ(ProfilerCollector(runner).runProfiler("A", ProfilerCollector::Trim::kMiddle),
-            body("A"));
-  EXPECT_EQ(runner.commands_ran_.size(), 4u);
-}
-
 }  // namespace
 }  // namespace cvn
 
