@@ -171,9 +171,9 @@ const Annotation* TagProperty::findAnnotation(std::string_view key) const {
 Tag::Tag(Kind kind, std::string name) : kind_(kind), name_(std::move(name)) {}
 
 Tag* Tag::findChild(std::string_view name) const {
-  if (!child_index_.empty()) {
-    auto it = child_index_.find(std::string(name));
-    return it == child_index_.end() ? nullptr : it->second;
+  if (child_index_) {
+    auto it = child_index_->find(std::string(name));
+    return it == child_index_->end() ? nullptr : it->second;
   }
   for (const auto& c : children_)
     if (c->name_ == name) return c.get();
@@ -181,9 +181,9 @@ Tag* Tag::findChild(std::string_view name) const {
 }
 
 TagProperty* Tag::findProperty(std::string_view name) const {
-  if (!property_index_.empty()) {
-    auto it = property_index_.find(std::string(name));
-    return it == property_index_.end() ? nullptr : it->second;
+  if (property_index_) {
+    auto it = property_index_->find(std::string(name));
+    return it == property_index_->end() ? nullptr : it->second;
   }
   for (const auto& p : properties_)
     if (p->name() == name) return p.get();
@@ -198,10 +198,11 @@ Tag& Tag::appendChild(std::string_view name) {
   makeBranch();
   children_.push_back(std::make_unique<Tag>(Kind::kLeaf, std::string(name)));
   Tag* child = children_.back().get();
-  if (!child_index_.empty()) {
-    child_index_.emplace(child->name_, child);  // keeps the first match
+  if (child_index_) {
+    child_index_->emplace(child->name_, child);  // keeps the first match
   } else if (children_.size() > kIndexThreshold) {
-    for (const auto& c : children_) child_index_.emplace(c->name_, c.get());
+    child_index_ = std::make_unique<std::unordered_map<std::string, Tag*>>();
+    for (const auto& c : children_) child_index_->emplace(c->name_, c.get());
   }
   return *child;
 }
@@ -238,10 +239,11 @@ TagProperty& Tag::setProperty(std::string_view name, const TagValue& value, cons
   TagProperty& prop = *properties_.back();
   prop.setValue(value);
   if (note_key && note_text) prop.addAnnotation(note_key, note_text);
-  if (!property_index_.empty()) {
-    property_index_.emplace(prop.name(), &prop);
+  if (property_index_) {
+    property_index_->emplace(prop.name(), &prop);
   } else if (properties_.size() > kIndexThreshold) {
-    for (const auto& p : properties_) property_index_.emplace(p->name(), p.get());
+    property_index_ = std::make_unique<std::unordered_map<std::string, TagProperty*>>();
+    for (const auto& p : properties_) property_index_->emplace(p->name(), p.get());
   }
   return prop;
 }
@@ -333,14 +335,14 @@ void Tag::copyFrom(const Tag& other) {
   value_ = other.value_ ? std::make_unique<TagValue>(*other.value_) : nullptr;
   annotations_ = other.annotations_;
   properties_.clear();
-  property_index_.clear();
+  property_index_.reset();
   for (const auto& p : other.properties_) {
     TagProperty& prop = setProperty(p->name(), TagValue());
     prop.value() = p->value();
     for (const Annotation& a : p->annotations()) prop.addAnnotation(a.key, a.text);
   }
   children_.clear();
-  child_index_.clear();
+  child_index_.reset();
   for (const auto& c : other.children_) appendCopyOf(*c);
   // Duplicate names are legal: appending copies, not setProperty, keeps them.
 }

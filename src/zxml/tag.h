@@ -177,9 +177,10 @@ class Tag {
   std::vector<std::unique_ptr<Tag>> children_;
   std::vector<std::unique_ptr<TagProperty>> properties_;
   std::vector<Annotation> annotations_;
-  // First-match indexes, built once a list grows past kIndexThreshold.
-  std::unordered_map<std::string, Tag*> child_index_;
-  std::unordered_map<std::string, TagProperty*> property_index_;
+  // First-match indexes, built once a list grows past kIndexThreshold; most
+  // tags never need one, so they cost a pointer until then.
+  std::unique_ptr<std::unordered_map<std::string, Tag*>> child_index_;
+  std::unique_ptr<std::unordered_map<std::string, TagProperty*>> property_index_;
 };
 
 /// An unnamed document tag whose first child is the top tag ("Macintosh",
