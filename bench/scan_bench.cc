@@ -137,32 +137,34 @@ void BM_Convert(benchmark::State& state) {
   state.counters["heap_MB"] = heapMegabytes();
 }
 
-void BM_PostProcess(benchmark::State& state) {
-  std::string doc = makeDocument(static_cast<int>(state.range(0)));
+// The document, its property list and the raw tree, ready for the stages
+// that come after conversion.
+struct ConvertedDocument {
+  explicit ConvertedDocument(int applications) : doc(makeDocument(applications)) {
+    parsePlist(doc, &plist);
+    PlistConverter(raw).convertPlist(plist);
+  }
+  std::string doc;
   PlistValue plist;
-  parsePlist(doc, &plist);
-  TagTree raw(true, "Macintosh");
-  PlistConverter(raw).convertPlist(plist);
+  TagTree raw{true, "Macintosh"};
   QuietRunner runner;
   NoFiles files;
+};
+
+void BM_PostProcess(benchmark::State& state) {
+  ConvertedDocument in(static_cast<int>(state.range(0)));
   for (auto _ : state) {
     TagTree snapshot(true, "Snapshot");
-    postProcess(snapshot, raw, false, runner, files, nullptr);
+    postProcess(snapshot, in.raw, false, in.runner, in.files, nullptr);
     benchmark::DoNotOptimize(snapshot);
   }
-  setCounters(state, doc.size());
+  setCounters(state, in.doc.size());
 }
 
 void BM_SerialiseAndSave(benchmark::State& state) {
-  std::string doc = makeDocument(static_cast<int>(state.range(0)));
-  PlistValue plist;
-  parsePlist(doc, &plist);
-  TagTree raw(true, "Macintosh");
-  PlistConverter(raw).convertPlist(plist);
-  QuietRunner runner;
-  NoFiles files;
+  ConvertedDocument in(static_cast<int>(state.range(0)));
   TagTree snapshot(true, "Snapshot");
-  postProcess(snapshot, raw, false, runner, files, nullptr);
+  postProcess(snapshot, in.raw, false, in.runner, in.files, nullptr);
   std::string path = "/tmp/cvn-scan-bench-" + std::to_string(getpid()) + ".qax";
   for (auto _ : state) {
     SnapshotFile file(true);
@@ -170,7 +172,7 @@ void BM_SerialiseAndSave(benchmark::State& state) {
     benchmark::DoNotOptimize(file.save(path, true));
   }
   std::remove(path.c_str());
-  setCounters(state, doc.size());
+  setCounters(state, in.doc.size());
 }
 
 BENCHMARK(BM_Parse)->Arg(2500)->Arg(5000)->Arg(10000)->Arg(20000)->Arg(40000)->Unit(
