@@ -4,6 +4,7 @@
 #include <cstdio>
 
 #include "collect/quick_facts.h"
+#include "sections/edid.h"
 #include "zxml/QAXfile.h"
 
 namespace cvn {
@@ -117,7 +118,7 @@ std::unique_ptr<TagTree> buildAssetInfo(uint8_t tree_flag, const TagTree& snapsh
   const Tag* monitors = video ? video->findChild("Monitors") : nullptr;
   t.setValue("/control/monitor-count",
              TagValue(std::to_string(monitors ? monitors->children().size() : 0)));
-  t.setValue("/control/monitor-diag", TagValue(facts.main_display_size));
+  t.setValue("/control/monitor-diag", TagValue(edidDiagonalText(facts.main_display_edid)));
   t.setValue("/control/hdd-capacity", TagValue(facts.disk_capacity));
   writeDiskEntries(t, snapshot);
   // Fixed: the console reads the firewall from the snapshot itself.
