@@ -67,6 +67,8 @@ class Reader {
   void start(const char* name);
   void end();
   void finishLeaf();
+  /// The leaf just closed as a value; false when CoreFoundation would refuse it.
+  bool readLeaf(PlistValue* value);
   void attach(PlistValue&& value);
   void drop(const char* why);
   void insert(Frame& frame, std::string&& key, PlistValue&& value);
@@ -210,46 +212,44 @@ void Reader::finishLeaf() {
     return;
   }
   PlistValue value;
-  switch (leaf_) {
-    case Element::kString:
-      value.kind = PlistValue::Kind::kString;
-      value.text = std::move(text_);
-      text_.clear();
-      break;
-    case Element::kInteger:
-      value.kind = PlistValue::Kind::kInteger;
-      readable = readable && parsePlistInteger(text_, &value.integer);
-      break;
-    case Element::kReal:
-      value.kind = PlistValue::Kind::kReal;
-      readable = readable && parsePlistReal(text_, &value.real);
-      break;
-    case Element::kDate:
-      value.kind = PlistValue::Kind::kDate;
-      readable = readable && parsePlistDate(text_, &value.integer);
-      break;
-    case Element::kTrue:
-    case Element::kFalse:
-      value.kind = PlistValue::Kind::kBoolean;
-      value.integer = leaf_ == Element::kTrue ? 1 : 0;
-      readable = readable && text_.empty();
-      break;
-    case Element::kData:
-      value.kind = PlistValue::Kind::kData;
-      // "<data/>" is refused where "<data></data>" is empty data; expat
-      // reports no bytes for the end of an empty-element tag.
-      readable = readable && XML_GetCurrentByteCount(parser_) != 0 &&
-                 decodePlistBase64(text_, &value.text);
-      break;
-    default:
-      readable = false;
-      break;
-  }
+  readable = readable && readLeaf(&value);
   if (!readable) {
     drop("unreadable value");
     return;
   }
   attach(std::move(value));
+}
+
+bool Reader::readLeaf(PlistValue* value) {
+  using Kind = PlistValue::Kind;
+  switch (leaf_) {
+    case Element::kString:
+      value->kind = Kind::kString;
+      value->text = std::move(text_);
+      text_.clear();
+      return true;
+    case Element::kInteger:
+      value->kind = Kind::kInteger;
+      return parsePlistInteger(text_, &value->integer);
+    case Element::kReal:
+      value->kind = Kind::kReal;
+      return parsePlistReal(text_, &value->real);
+    case Element::kDate:
+      value->kind = Kind::kDate;
+      return parsePlistDate(text_, &value->integer);
+    case Element::kTrue:
+    case Element::kFalse:
+      value->kind = Kind::kBoolean;
+      value->integer = leaf_ == Element::kTrue ? 1 : 0;
+      return text_.empty();
+    case Element::kData:
+      value->kind = Kind::kData;
+      // "<data/>" is refused where "<data></data>" is empty data; expat
+      // reports no bytes for the end of an empty-element tag.
+      return XML_GetCurrentByteCount(parser_) != 0 && decodePlistBase64(text_, &value->text);
+    default:
+      return false;
+  }
 }
 
 void Reader::end() {

@@ -3,6 +3,8 @@
 #include <cstdint>
 #include <cstring>
 
+#include "collect/plist_leaves.h"
+
 namespace cvn {
 namespace {
 
@@ -142,20 +144,8 @@ void Cleaner::copyReference() {
     if (hex) ++j;
     uint32_t value = 0;
     size_t digits = 0;
-    for (; j < n_ && digits <= 8; ++j, ++digits) {
-      unsigned char c = p_[j];
-      uint32_t d;
-      if (c >= '0' && c <= '9') {
-        d = c - '0';
-      } else if (hex && c >= 'a' && c <= 'f') {
-        d = c - 'a' + 10;
-      } else if (hex && c >= 'A' && c <= 'F') {
-        d = c - 'A' + 10;
-      } else {
-        break;
-      }
+    for (unsigned d = 0; j < n_ && digits <= 8 && digitValue(p_[j], hex, &d); ++j, ++digits)
       value = value * (hex ? 16 : 10) + d;
-    }
     if (digits > 0 && digits <= 8 && j < n_ && p_[j] == ';') {
       size_t len = j + 1 - i_;
       if (value < 0x20 && value != '\t' && value != '\n' && value != '\r') {
@@ -233,19 +223,13 @@ std::string Cleaner::run() {
         }
         break;
       case State::kCData:
-        if (startsWith("]]>")) {
-          state = State::kText;
-          copy(3);
-        } else {
-          copyContentByte(true);
-        }
-        break;
       case State::kComment:
-        if (startsWith("-->")) {
+        // Character data either way; only CDATA keeps its CR bytes.
+        if (startsWith(state == State::kCData ? "]]>" : "-->")) {
           state = State::kText;
           copy(3);
         } else {
-          copyContentByte(false);
+          copyContentByte(state == State::kCData);
         }
         break;
       case State::kProcessing:

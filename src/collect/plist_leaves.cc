@@ -31,6 +31,19 @@ int64_t daysFromCivil(int64_t y, int64_t m, int64_t d) {
 
 }  // namespace
 
+bool digitValue(unsigned char c, bool hex, unsigned* value) {
+  if (c >= '0' && c <= '9') {
+    *value = c - '0';
+  } else if (hex && c >= 'a' && c <= 'f') {
+    *value = c - 'a' + 10;
+  } else if (hex && c >= 'A' && c <= 'F') {
+    *value = c - 'A' + 10;
+  } else {
+    return false;
+  }
+  return true;
+}
+
 bool parsePlistInteger(std::string_view s, int64_t* out) {
   size_t i = 0;
   auto skipBlanks = [&] {
@@ -53,17 +66,8 @@ bool parsePlistInteger(std::string_view s, int64_t* out) {
   constexpr uint64_t kMax = std::numeric_limits<uint64_t>::max();
   unsigned base = hex ? 16 : 10;
   for (; i < s.size(); ++i) {
-    char c = s[i];
     unsigned d;
-    if (c >= '0' && c <= '9') {
-      d = c - '0';
-    } else if (hex && c >= 'a' && c <= 'f') {
-      d = c - 'a' + 10;
-    } else if (hex && c >= 'A' && c <= 'F') {
-      d = c - 'A' + 10;
-    } else {
-      return false;
-    }
+    if (!digitValue(static_cast<unsigned char>(s[i]), hex, &d)) return false;
     if (value > (kMax - d) / base) return false;
     value = value * base + d;
   }

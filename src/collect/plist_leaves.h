@@ -9,6 +9,8 @@
 
 namespace cvn {
 
+/// The value of one decimal digit, or of a hexadecimal one when `hex`.
+bool digitValue(unsigned char c, bool hex, unsigned* value);
 /// Decimal or "0x" hexadecimal, signed, blanks around; literals above
 /// 2^63-1 keep their low 64 bits.
 bool parsePlistInteger(std::string_view text, int64_t* out);
