@@ -103,5 +103,28 @@ TEST(QaxReaderTest, ContinuationLinesJoinTheValueAbove) {
   EXPECT_EQ(renderZxmlText(tree), text);
 }
 
+// Lines that read one way here but could be markup to another reader: the
+// inspector's check fails on them.
+TEST(QaxReaderTest, TextThatReadsTwoWaysIsNamed) {
+  const std::pair<std::string, std::vector<std::string>> cases[] = {
+      {"+S=v\nplain\n\nmore\n-\n", {}},
+      {"+S=v\n-x\n-\n",
+       {"line 3: continuation line begins with \"-\", which a reader could take for markup"}},
+      {"+S=v\n+Evil\n~k=a\n*x\n-\n",
+       {"line 3: continuation line begins with \"+\", which a reader could take for markup",
+        "line 5: continuation line begins with \"*\", which a reader could take for markup"}},
+      {"+S=\np=a\n~x\n-=1\n-\n",
+       {"line 4: continuation line begins with \"~\", which a reader could take for markup",
+        "line 5: property name begins with \"-\", which a reader could take for a close"}},
+  };
+  for (const auto& c : cases) {
+    QaxTree tree;
+    std::string error;
+    std::vector<std::string> ambiguities;
+    EXPECT_TRUE(parseZxmlText(kHeader + c.first, &tree, nullptr, &error, 0, &ambiguities)) << error;
+    EXPECT_EQ(ambiguities, c.second) << c.first;
+  }
+}
+
 }  // namespace
 }  // namespace cvn

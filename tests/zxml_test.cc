@@ -78,6 +78,59 @@ TEST(ZxmlTest, SplitBlockHasSectionsAndDirectory) {
             sections + directory + position + std::string("\x01\x00", 2));
 }
 
+// What a reader gets back for a collected text, by where it goes: nothing a
+// tool prints may open, close or hide a line of markup.
+TEST(ZxmlTest, CollectedTextCannotWriteMarkup) {
+  const ZxmlField kName = ZxmlField::kName, kValue = ZxmlField::kValue;
+  const std::string almost(kMaxZxmlText - 1, 'a');
+  const struct {
+    std::string text;
+    ZxmlField field;
+    std::string stored;
+  } cases[] = {
+      {"Carol Q. Example\n Administrator", kValue, "Carol Q. Example\n Administrator"},
+      {"z\n-\n+Evil=1", kValue, "z - +Evil=1"},
+      {"a\n*leaf\n~note\nclean", kValue, "a *leaf ~note\nclean"},
+      {"a\nb\nc=d", kValue, "a b c=d"},  // joined, the line of b holds "=" too
+      {"a\n\nb\n", kValue, "a\n\nb\n"},
+      {"x\n-", kValue, "x -"},
+      {"\n-", kValue, " -"},
+      {"a=b~c+d*e-f", kValue, "a=b~c+d*e-f"},
+      {std::string("Safari\0\n-\n+Evil=1", 18), kValue, "Safari"},
+      {std::string("\0tail", 5), kValue, ""},
+      {"", kValue, ""},
+      {"usr-acc:=eq", kName, "usr-acc:_eq"},
+      {"Soft:z\n-\n+Evil=1 1.0", kName, "Soft:z - +Evil_1 1.0"},
+      {"Soft:Carol\n plain", kName, "Soft:Carol  plain"},
+      {std::string("Soft:a\0b", 8), kName, "Soft:a"},
+      {"Soft:+*-~", kName, "Soft:+*-~"},
+      // Cut at the limit, backing off to the start of a split UTF-8 sequence.
+      {almost + "ab", kValue, almost + "a"},
+      {almost + "\xC3\xA9", kValue, almost},
+      {almost + "\xE2\x80\x99", kName, almost},
+      {almost + "a\xE2\x80\x99", kValue, almost + "a"},
+  };
+  for (const auto& c : cases) {
+    std::string shown = c.text.substr(0, 40);
+    EXPECT_EQ(zxmlText(c.text, c.field), c.stored) << shown;
+  }
+}
+
+// Each kind of line escapes its own texts, and the size estimate stays an
+// upper bound however long the texts are.
+TEST(ZxmlTest, DumpEscapesEveryNameAndValue) {
+  TagTree tree(true, "Snapshot");
+  Tag& section = tree.top().addChild("Processes");
+  Tag& process = section.setChildValue("process:1", TagValue("z\n-\n+Evil=1"));
+  process.addAnnotation("no\nte=", "t\n~x");
+  process.setProperty("cmd=line", TagValue(std::string("a\0b", 3)), "k", "v\n-");
+  section.setChildValue("=eq", TagValue(std::string(kMaxZxmlText + 5, 'n')));
+  const std::string text = dump(tree);
+  EXPECT_EQ(text, kHeader + "+Snapshot=\n+Processes=\n*process:1=z - +Evil=1\n~no te_=t ~x\n" +
+                      "cmd_line=a\n~k=v -\n*_eq=" + std::string(kMaxZxmlText, 'n') + "\n-\n-\n");
+  EXPECT_LT(tree.textSize(), text.size() + 200);
+}
+
 TEST(ZxmlTest, MatchesOneShotLevel9AroundTheChunkSize) {
   for (size_t size : {size_t{0}, size_t{16383}, size_t{16384}, size_t{16385}, size_t{50000}}) {
     std::vector<uint8_t> input(size);

@@ -227,8 +227,9 @@ std::string blockWhere(const QaxBlock& b) {
   return "block " + numberText(b.index) + " (" + b.type + ", offset " + numberText(b.offset) + ")";
 }
 
-void addWarnings(const QaxBlock& b, std::vector<std::string>& found, QaxFile* file) {
-  for (const std::string& w : found) file->warnings.push_back(blockWhere(b) + " " + w);
+void addWarnings(const QaxBlock& b, const std::vector<std::string>& found,
+                 std::vector<std::string>& into) {
+  for (const std::string& w : found) into.push_back(blockWhere(b) + " " + w);
 }
 
 bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::string* error) {
@@ -291,11 +292,13 @@ bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::
     *error = blockWhere(*b) + ": no \"ZXML\" block trailer";
     return false;
   }
-  if (!parseZxmlText(b->text, &b->tree, &warnings, &detail, allowed_open)) {
+  std::vector<std::string> ambiguities;
+  if (!parseZxmlText(b->text, &b->tree, &warnings, &detail, allowed_open, &ambiguities)) {
     *error = blockWhere(*b) + " " + detail;
     return false;
   }
-  addWarnings(*b, warnings, file);
+  addWarnings(*b, warnings, file->warnings);
+  addWarnings(*b, ambiguities, file->ambiguities);
   return true;
 }
 

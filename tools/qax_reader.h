@@ -49,6 +49,9 @@ struct QaxFile {
   std::vector<QaxBlock> blocks;
   /// Oddities that do not make the file unreadable (values spanning lines).
   std::vector<std::string> warnings;
+  /// Lines that another reader could take for different structure than this
+  /// one does; a file the agent wrote has none.
+  std::vector<std::string> ambiguities;
 
   /// The first block of that directory type, or null.
   const QaxBlock* findBlock(std::string_view type) const;

@@ -1,7 +1,8 @@
 // qaxdump: shows what a snapshot result file holds.
 //   qaxdump FILE          the directory, then every block as stored
 //   qaxdump --json FILE   the directory and the trees as JSON
-//   qaxdump --check FILE  validates the file and prints "ok"
+//   qaxdump --check FILE  validates the file and prints "ok"; text that
+//                         reads two ways fails it like damage
 #include <cstdio>
 #include <cstring>
 #include <string>
@@ -78,6 +79,12 @@ int main(int argc, char** argv) {
     std::string json = cvn::renderQaxJson(file);
     std::fwrite(json.data(), 1, json.size(), stdout);
   } else {
+    // Text that reads two ways is as bad as damage: what an importer sees
+    // would depend on how it reads.
+    if (!file.ambiguities.empty()) {
+      std::fprintf(stderr, "qaxdump: %s: %s\n", path, file.ambiguities.front().c_str());
+      return 1;
+    }
     for (const std::string& w : file.warnings)
       std::fprintf(stderr, "qaxdump: %s: warning: %s\n", path, w.c_str());
     std::printf("ok\n");

@@ -22,8 +22,10 @@ std::string lineError(size_t line, const std::string& what) {
   return "line " + std::to_string(line) + ": " + what;
 }
 
+bool opensMarkup(char c) { return c == '+' || c == '*' || c == '-' || c == '~'; }
+
 bool parseZxml(std::string_view text, QaxTree* out, std::vector<std::string>* warnings,
-               std::string* error, size_t allowed_open) {
+               std::string* error, size_t allowed_open, std::vector<std::string>* ambiguities) {
   out->nodes.clear();
   if (text.substr(0, kZxmlHeader.size()) != kZxmlHeader) {
     *error = lineError(1, "no \"?zxml\" header line with the byte-order mark");
@@ -65,6 +67,10 @@ bool parseZxml(std::string_view text, QaxTree* out, std::vector<std::string>* wa
       }
       st.last_value->push_back('\n');
       st.last_value->append(line);
+      if (ambiguities && !line.empty() && opensMarkup(line.front()))
+        ambiguities->push_back(
+            lineError(line_number, std::string("continuation line begins with \"") + line.front() +
+                                       "\", which a reader could take for markup"));
       if (warnings)
         warnings->push_back(lineError(line_number,
                                       "no \"=\"; taken as the continuation of the "
@@ -105,6 +111,9 @@ bool parseZxml(std::string_view text, QaxTree* out, std::vector<std::string>* wa
         *error = lineError(line_number, "property outside a tag (after a closing \"-\")");
         return false;
       }
+      if (ambiguities && first == '-')
+        ambiguities->push_back(lineError(
+            line_number, "property name begins with \"-\", which a reader could take for a close"));
       st.current->properties.push_back(
           QaxProperty{std::string(line.substr(0, eq)), std::string(line.substr(eq + 1)), {}});
       st.property = &st.current->properties.back();
@@ -170,8 +179,8 @@ const QaxProperty* QaxTree::findProperty(std::string_view path, std::string_view
 }
 
 bool parseZxmlText(std::string_view text, QaxTree* out, std::vector<std::string>* warnings,
-                   std::string* error, size_t allowed_open) {
-  return parseZxml(text, out, warnings, error, allowed_open);
+                   std::string* error, size_t allowed_open, std::vector<std::string>* ambiguities) {
+  return parseZxml(text, out, warnings, error, allowed_open, ambiguities);
 }
 
 std::string renderZxmlText(const QaxTree& tree) {

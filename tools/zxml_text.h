@@ -51,9 +51,13 @@ struct QaxTree {
 
 /// Parses ZXML text (header line included). Continuation lines are reported
 /// in `warnings` (may be null). `allowed_open` tags may stay open at the
-/// end (a split block leaves the top tag to its trailer).
+/// end (a split block leaves the top tag to its trailer). Lines that this
+/// reader takes one way but another reader could take for markup (a
+/// continuation line that begins with "+", "*", "-" or "~", a property whose
+/// name begins with "-") go to `ambiguities` (may be null).
 bool parseZxmlText(std::string_view text, QaxTree* out, std::vector<std::string>* warnings,
-                   std::string* error, size_t allowed_open = 0);
+                   std::string* error, size_t allowed_open = 0,
+                   std::vector<std::string>* ambiguities = nullptr);
 /// The tree as ZXML text, header line included.
 std::string renderZxmlText(const QaxTree& tree);
 

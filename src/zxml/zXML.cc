@@ -3,6 +3,8 @@
 
 #include <zlib.h>
 
+#include <algorithm>
+#include <array>
 #include <cinttypes>
 #include <cstdio>
 #include <cstdlib>
@@ -24,48 +26,146 @@ constexpr size_t kHeaderLength = sizeof kHeader - 1;
 #define CVN_CHECK(module, expr) \
   ((expr) ? static_cast<void>(0) : failAssertion((module), __LINE__, #expr))
 
+// How many bytes of `text` the dump keeps: up to the first NUL (the format's
+// texts were always C strings) and at most kMaxZxmlText, backing off to the
+// start of a UTF-8 sequence that the limit would split.
+size_t keptLength(std::string_view text) {
+  if (text.empty()) return 0;
+  size_t n = std::min(text.size(), kMaxZxmlText);
+  if (const void* nul = std::memchr(text.data(), '\0', n))
+    return static_cast<size_t>(static_cast<const char*>(nul) - text.data());
+  if (n == text.size()) return n;
+  for (int back = 0; back < 3 && (static_cast<unsigned char>(text[n]) & 0xC0) == 0x80; ++back) --n;
+  return n;
+}
+
+inline bool opensMarkup(char c) { return c == '+' || c == '*' || c == '-' || c == '~'; }
+
+// Decided from the end backwards: a break that becomes a blank joins its line
+// to the one before, which must then be judged with the joined text.
+void blankMarkupBreaks(char* text, size_t size, size_t first_break) {
+  bool line_has_equals = false;
+  for (size_t i = size; i-- > first_break;) {
+    if (text[i] == '=') {
+      line_has_equals = true;
+    } else if (text[i] == '\n') {
+      bool markup = line_has_equals || (i + 1 < size && opensMarkup(text[i + 1]));
+      if (markup)
+        text[i] = ' ';
+      else
+        line_has_equals = false;
+    }
+  }
+}
+
+// Bytes that make a text need more than a copy: NUL and the line break
+// anywhere, "=" in names.
+constexpr uint8_t kValueMask = 1;
+constexpr uint8_t kNameMask = 2;
+constexpr std::array<uint8_t, 256> kSpecialBytes = [] {
+  std::array<uint8_t, 256> table{};
+  table['\0'] = table['\n'] = kValueMask | kNameMask;
+  table['='] = kNameMask;
+  return table;
+}();
+// Real names and values are short; longer texts are searched with memchr.
+constexpr size_t kShortText = 256;
+
+__attribute__((noinline)) size_t writeEscapedText(char* out, std::string_view text,
+                                                  ZxmlField field) {
+  size_t size = keptLength(text);
+  if (size == 0) return 0;
+  std::memcpy(out, text.data(), size);
+  const void* line_break = std::memchr(out, '\n', size);
+  if (field == ZxmlField::kValue) {
+    if (line_break)
+      blankMarkupBreaks(out, size, static_cast<size_t>(static_cast<const char*>(line_break) - out));
+    return size;
+  }
+  // A name's line always goes on with "=" and the value, so no break in a
+  // name can start a line that reads as text.
+  if (line_break || std::memchr(out, '=', size)) {
+    for (size_t i = 0; i < size; ++i) {
+      if (out[i] == '=')
+        out[i] = '_';
+      else if (out[i] == '\n')
+        out[i] = ' ';
+    }
+  }
+  return size;
+}
+
+constexpr uint64_t kOnes = 0x0101010101010101ull;
+
+// Non-zero when one of the eight bytes of `word` equals `byte`.
+inline uint64_t holdsByte(uint64_t word, uint8_t byte) {
+  word ^= kOnes * byte;
+  return (word - kOnes) & ~word & (kOnes << 7);
+}
+
+// The common case, a short text with nothing to escape, is a look at eight
+// bytes at a time and a copy.
+inline size_t writeText(char* out, std::string_view text, ZxmlField field) {
+  size_t size = text.size();
+  if (size > kShortText) return writeEscapedText(out, text, field);
+  const bool name = field == ZxmlField::kName;
+  const char* bytes = text.data();
+  size_t i = 0;
+  for (; i + 8 <= size; i += 8) {
+    uint64_t word;
+    std::memcpy(&word, bytes + i, 8);
+    if (holdsByte(word, '\0') | holdsByte(word, '\n') | (name ? holdsByte(word, '=') : 0))
+      return writeEscapedText(out, text, field);
+  }
+  const uint8_t mask = name ? kNameMask : kValueMask;
+  for (; i < size; ++i)
+    if (kSpecialBytes[static_cast<unsigned char>(bytes[i])] & mask)
+      return writeEscapedText(out, text, field);
+  if (size) std::memcpy(out, bytes, size);
+  return size;
+}
+
 // Text values dominate real trees; they are measured and copied here without
 // a call, numbers go through TagValue.
 inline size_t valueLength(const TagValue& v) {
-  return v.isText() ? v.text().size() : v.isNone() ? 0 : v.textLength();
+  return v.isText() ? std::min(v.text().size(), kMaxZxmlText) : v.isNone() ? 0 : v.textLength();
 }
 
+inline size_t nameLength(const std::string& s) { return std::min(s.size(), kMaxZxmlText); }
+
 inline char* writeValue(char* out, const TagValue& v) {
-  if (v.isText()) {
-    std::memcpy(out, v.text().data(), v.text().size());
-    return out + v.text().size();
-  }
+  if (v.isText()) return out + writeText(out, v.text(), ZxmlField::kValue);
   return v.isNone() ? out : out + v.writeText(out);
 }
 
 size_t measureAnnotations(const std::vector<Annotation>& annotations) {
   size_t size = 0;
-  for (const Annotation& a : annotations) size += a.key.size() + a.text.size() + 3;  // ~ = \n
+  for (const Annotation& a : annotations)
+    size += nameLength(a.key) + nameLength(a.text) + 3;  // ~ = \n
   return size;
 }
 
 size_t measureTag(const Tag& tag) {
-  size_t size = 1 + tag.name().size() + 1 + (tag.value() ? valueLength(*tag.value()) : 0) + 1;
+  size_t size = 1 + nameLength(tag.name()) + 1 + (tag.value() ? valueLength(*tag.value()) : 0) + 1;
   size += measureAnnotations(tag.annotations());
   for (const auto& p : tag.properties())
-    size +=
-        p->name().size() + 1 + p->value().textLength() + 1 + measureAnnotations(p->annotations());
+    size += nameLength(p->name()) + 1 + valueLength(p->value()) + 1 +
+            measureAnnotations(p->annotations());
   for (const auto& c : tag.children()) size += measureTag(*c);
   if (tag.kind() == Tag::Kind::kBranch) size += 2;
   return size;
 }
 
-char* writeBytes(char* out, const std::string& s) {
-  std::memcpy(out, s.data(), s.size());
-  return out + s.size();
+inline char* writeName(char* out, const std::string& s) {
+  return out + writeText(out, s, ZxmlField::kName);
 }
 
 char* writeAnnotations(char* out, const std::vector<Annotation>& annotations) {
   for (const Annotation& a : annotations) {
     *out++ = '~';
-    out = writeBytes(out, a.key);
+    out = writeName(out, a.key);
     *out++ = '=';
-    out = writeBytes(out, a.text);
+    out += writeText(out, a.text, ZxmlField::kValue);
     *out++ = '\n';
   }
   return out;
@@ -76,13 +176,13 @@ char* writeAnnotations(char* out, const std::vector<Annotation>& annotations) {
 char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
   bool branch = tag.kind() == Tag::Kind::kBranch;
   *out++ = branch ? '+' : '*';
-  out = writeBytes(out, tag.name());
+  out = writeName(out, tag.name());
   *out++ = '=';
   if (tag.value()) out = writeValue(out, *tag.value());
   *out++ = '\n';
   out = writeAnnotations(out, tag.annotations());
   for (const auto& p : tag.properties()) {
-    out = writeBytes(out, p->name());
+    out = writeName(out, p->name());
     *out++ = '=';
     out = writeValue(out, p->value());
     *out++ = '\n';
@@ -133,7 +233,7 @@ std::vector<uint8_t> serialiseSplit(const TagTree& tree, bool compressed) {
   for (const auto& child : tree.top().children()) {
     char* begin = out;
     out = writeTag(out, *child, kCloseTags, kWithChildren);
-    addSection(child->name(), begin, out);
+    addSection(zxmlText(child->name(), ZxmlField::kName), begin, out);
   }
   size_t directory_position = static_cast<size_t>(out - start);
   std::vector<uint8_t> payload(start, out);
@@ -147,6 +247,16 @@ std::vector<uint8_t> serialiseSplit(const TagTree& tree, bool compressed) {
 }
 
 }  // namespace
+
+size_t writeZxmlText(char* out, std::string_view text, ZxmlField field) {
+  return writeText(out, text, field);
+}
+
+std::string zxmlText(std::string_view text, ZxmlField field) {
+  std::string out(std::min(text.size(), kMaxZxmlText), '\0');
+  out.resize(writeZxmlText(&out[0], text, field));
+  return out;
+}
 
 void failAssertion(const char* module, unsigned line, const char* expression) {
   std::fprintf(stderr, "%s:%u: failed assertion `%s'\n", module, line, expression);
