@@ -5,6 +5,11 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <signal.h>
+#include <spawn.h>
+#include <sys/stat.h>
+
+#include <algorithm>
 #include <cctype>
 #include <cstdio>
 #include <cstdlib>
@@ -16,11 +21,14 @@
 
 #include "qax_reader.h"
 
+extern char** environ;
+
 namespace cvn {
 namespace {
 
 const std::string kSource = CVN_SOURCE_DIR;
 const std::string kAgent = std::string(CVN_BINARY_DIR) + "/cvnmacagent";
+const std::string kQaxdump = std::string(CVN_BINARY_DIR) + "/qaxdump";
 const std::string kSampleName = "JANE-MBP_0026BB5C3A91.qax";
 
 std::string readFile(const std::string& path) {
@@ -82,9 +90,11 @@ class EndToEndTest : public ::testing::Test {
   AgentRun run(const std::vector<std::string>& args, const std::string& input = "",
                const std::string& env = "") {
     writeFile(root_ + "/stdin", input);
-    std::string command = "cd " + quote(work_) + " && PATH=" + quote(kSource + "/tests/fake_bin") +
+    std::string command = "cd " + quote(work_) + " && " + shell_prefix_ +
+                          "PATH=" + quote(kSource + "/tests/fake_bin") +
                           ":\"$PATH\" FAKE_MAC_DIR=" + quote(mac_dir_) +
-                          " FAKE_STATE_DIR=" + quote(state_) + " " + env + " " + quote(kAgent);
+                          " FAKE_STATE_DIR=" + quote(state_) + " " + env + " " + agent_prefix_ +
+                          quote(kAgent);
     for (const std::string& a : args) command += " " + quote(a);
     command += " <" + quote(root_ + "/stdin") + " >" + quote(root_ + "/out") + " 2>" +
                quote(root_ + "/err");
@@ -109,8 +119,64 @@ class EndToEndTest : public ::testing::Test {
     return p ? p->value : "<missing>";
   }
 
+  /// The file name a silent run reported.
+  static std::string reportedName(const AgentRun& r) {
+    if (r.out.compare(0, 3, ">>>") != 0 || r.out.back() != '\n') return "<none>";
+    return r.out.substr(3, r.out.size() - 4);
+  }
+
+  /// What the inspector's check says: "ok" or its complaint.
+  std::string check(const std::string& name) {
+    std::string command = quote(kQaxdump) + " --check " + quote(work_ + "/" + name) + " >" +
+                          quote(root_ + "/check") + " 2>&1";
+    int status = std::system(command.c_str());
+    std::string said = readFile(root_ + "/check");
+    return status == 0 && said.size() >= 3 && said.compare(said.size() - 3, 3, "ok\n") == 0 ? "ok"
+                                                                                            : said;
+  }
+
+  std::vector<std::string> filesInWork() {
+    std::vector<std::string> names;
+    for (const auto& entry : std::filesystem::directory_iterator(work_))
+      names.push_back(entry.path().filename().string());
+    std::sort(names.begin(), names.end());
+    return names;
+  }
+
+  /// Shell text run before the agent in its shell (limits, traps).
+  std::string shell_prefix_;
+  /// A command that runs the agent (timeout).
+  std::string agent_prefix_;
   std::string root_, work_, state_, mac_dir_;
 };
+
+// The sections of a snapshot and how many records each holds; the process
+// list changes from run to run, so there only the record names count.
+std::vector<std::string> sectionShape(const QaxTree& tree) {
+  std::vector<std::string> shape;
+  for (const QaxNode& section : tree.top()->children) {
+    if (section.name != "Processes") {
+      std::string line = section.name + ":";
+      for (const QaxNode& group : section.children)
+        line += " " + std::to_string(group.children.size());
+      shape.push_back(line + " (" + std::to_string(section.children.size()) + ")");
+      continue;
+    }
+    bool only_processes = true;
+    for (const QaxNode& p : section.children)
+      only_processes = only_processes && p.name.compare(0, 8, "process:") == 0 && !p.branch;
+    shape.push_back(only_processes ? "Processes" : "Processes with other records");
+  }
+  return shape;
+}
+
+void replaceOnce(const std::string& path, const std::string& from, const std::string& to) {
+  std::string text = readFile(path);
+  size_t at = text.find(from);
+  ASSERT_NE(at, std::string::npos) << from << " in " << path;
+  text.replace(at, from.size(), to);
+  writeFile(path, text);
+}
 
 TEST_F(EndToEndTest, SilentRunPrintsOnlyTheFileNameAndNeverOverwrites) {
   for (const char* expected : {"JANE-MBP_0026BB5C3A91.qax", "JANE-MBP_0026BB5C3A91(1).qax",
@@ -365,6 +431,191 @@ TEST_F(EndToEndTest, AFiftyMegabyteApplicationListIsScanned) {
   ASSERT_NE(software, nullptr);
   EXPECT_NE(software->findChild("Soft:Generated 5599 1.0"), nullptr);
   EXPECT_NE(software->findChild("Soft:Safari 5.1"), nullptr);
+}
+
+// Text a local user can put into what the tools print, written to break the
+// result's structure: a process started from a file with line breaks in its
+// name, an application's name, a full name in the directory service, a USB
+// volume's and a disk's media name, a user folder with "=". Every file keeps
+// the sections of a clean scan, the check accepts it, and the record reads
+// back as its text with the markup defused.
+TEST_F(EndToEndTest, CollectedTextCannotForgeStructure) {
+  AgentRun clean = run({"-silent"});
+  ASSERT_EQ(reportedName(clean), kSampleName);
+  const std::vector<std::string> clean_shape = sectionShape(readResult(kSampleName).blocks[0].tree);
+  ASSERT_EQ(std::system(("rm -f " + quote(work_ + "/" + kSampleName)).c_str()), 0);
+
+  // Any local user can start a process from a file named like this.
+  const std::string process_name = "z\n-\n+Evil=1";
+  const std::string program = root_ + "/" + process_name;
+  ASSERT_EQ(symlink("/bin/sleep", program.c_str()), 0);
+  char arg0[] = "z", arg1[] = "600";
+  char* argv[] = {arg0, arg1, nullptr};
+  pid_t hostile = 0;
+  ASSERT_EQ(posix_spawn(&hostile, program.c_str(), nullptr, nullptr, argv, environ), 0);
+
+  const struct {
+    const char* route;
+    const char* file;  // in the sample Mac; empty for none
+    std::string from, to;
+    const char* node;
+    const char* property;  // empty: the tag's own value
+    std::string stored;
+  } routes[] = {
+      {"process name", "", "", "", "", "", ""},
+      {"application name", "profiler/SPApplicationsDataType.xml", "<string>Safari</string>",
+       "<string>Safari\n-\n+Evil=1</string>", "/Software/Soft:Safari - +Evil_1 5.1", "",
+       "Safari - +Evil=1"},
+      {"application name, unbalanced", "profiler/SPApplicationsDataType.xml",
+       "<string>Mail</string>", "<string>Mail\n-\n-\n-\n</string>",
+       "/Software/Soft:Mail - - -  4.5", "", "Mail - - -\n"},
+      {"application name with NUL", "profiler/SPApplicationsDataType.xml",
+       "<string>Terminal</string>", std::string("<string>Term\0inal\n-</string>", 28),
+       "/Software/Soft:Term", "", "Term"},
+      {"dscl RealName", "users/jane.txt", "RealName:\n Jane Appleseed\n",
+       "RealName:\n Jane Appleseed\n-\n+Evil=1\n", "/User-accounts/usr-acc:jane", "fullname",
+       "Jane Appleseed - +Evil=1"},
+      {"dscl RealName on two lines", "users/admin.txt", "RealName: Administrator\n",
+       "RealName: Carol Q. Example\n Administrator\n", "/User-accounts/usr-acc:admin", "fullname",
+       "Carol Q. Example\n Administrator"},
+      {"USB volume name", "profiler/SPUSBDataType.xml", "<string>JANE_USB</string>",
+       "<string>JANE_USB\n-\n-\n+Evil=1</string>", "/Storage/Logical-disks/partition:3", "",
+       "JANE_USB - - +Evil=1"},
+      {"diskutil media name", "diskutil/disk2.txt", "Flash Disk Media", "Flash\n-\n+Evil=1 Media",
+       "/Storage/Physical-disks/Removable:1", "model", "Flash - +Evil=1"},
+      {"user folder with =", "users/ls.txt", "jane\n", "=eq\n", "/User-accounts/usr-acc:_eq",
+       "hdir", "/users/=eq"},
+  };
+  for (const auto& r : routes) {
+    SCOPED_TRACE(r.route);
+    const std::string mac = root_ + "/mac";
+    ASSERT_EQ(std::system(("rm -rf " + quote(mac)).c_str()), 0);
+    copySampleMac();
+    if (*r.file) replaceOnce(mac + "/" + r.file, r.from, r.to);
+    if (r.to == "=eq\n") {
+      replaceOnce(mac + "/users/jane.txt", "RecordName: jane", "RecordName: =eq");
+      ASSERT_EQ(std::rename((mac + "/users/jane.txt").c_str(), (mac + "/users/=eq.txt").c_str()),
+                0);
+    }
+    AgentRun result = run({"-silent"});
+    const std::string name = reportedName(result);
+    EXPECT_EQ(check(name), "ok");
+    QaxFile file = readResult(name);
+    ASSERT_EQ(file.blocks.size(), 2u);
+    const QaxTree& snapshot = file.blocks[0].tree;
+    EXPECT_EQ(sectionShape(snapshot), clean_shape);
+    bool found_process = false;
+    for (const QaxNode& p : snapshot.findNode("Processes")->children)
+      found_process = found_process || p.value == "z - +Evil=1";
+    EXPECT_TRUE(found_process);
+    if (*r.node) {
+      const QaxNode* node = snapshot.findNode(r.node);
+      ASSERT_NE(node, nullptr) << r.node;
+      const QaxProperty* p = *r.property ? node->findProperty(r.property) : nullptr;
+      EXPECT_EQ(*r.property ? (p ? p->value : "<missing>") : node->value, r.stored);
+    }
+    ASSERT_EQ(std::system(("rm -f " + quote(work_ + "/" + name)).c_str()), 0);
+  }
+  kill(hostile, SIGKILL);
+  waitpid(hostile, nullptr, 0);
+}
+
+// The host part comes from the NetBIOS name, which a user can set: it may
+// neither lead out of the working directory nor make the name too long.
+TEST_F(EndToEndTest, TheResultStaysInTheWorkingDirectoryUnderAFittingName) {
+  const std::string mac = copySampleMac();
+  const std::string location = mac + "/profiler/SPNetworkLocationDataType.xml";
+  const std::string original = readFile(location);
+  std::string long_host;
+  for (int i = 0; i < 100; ++i) long_host += "Mac";
+  const std::string cut(long_host.substr(0, 226));
+  std::string upper_cut;
+  for (char c : cut) upper_cut += static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
+  const struct {
+    std::string netbios;
+    std::vector<std::string> names;  // of two runs
+  } cases[] = {
+      {"../ESCTEST/X", {"_._ESCTEST_X_0026BB5C3A91.qax", "_._ESCTEST_X_0026BB5C3A91(1).qax"}},
+      {long_host, {upper_cut + "_0026BB5C3A91.qax", upper_cut + "_0026BB5C3A91(1).qax"}},
+  };
+  for (const auto& c : cases) {
+    writeFile(location, original);
+    replaceOnce(location, "<string>Jane-MBP</string>", "<string>" + c.netbios + "</string>");
+    for (const std::string& expected : c.names) {
+      AgentRun r = run({"-silent"});
+      EXPECT_EQ(r.out, ">>>" + expected + "\n");
+      EXPECT_LE(expected.size(), 255u);
+      EXPECT_EQ(access((work_ + "/" + expected).c_str(), F_OK), 0) << expected;
+    }
+    std::vector<std::string> sorted = c.names;
+    std::sort(sorted.begin(), sorted.end());
+    EXPECT_EQ(filesInWork(), sorted);
+    ASSERT_EQ(std::system(("rm -f " + quote(work_) + "/*").c_str()), 0);
+  }
+  EXPECT_NE(access((root_ + "/ESCTEST").c_str(), F_OK), 0) << "written outside the directory";
+}
+
+// Whatever bears the name, the save moves on to the next counter: it never
+// writes through a dangling link, never waits on a FIFO.
+TEST_F(EndToEndTest, ANameTakenByAnythingIsPassedOver) {
+  const std::string base = work_ + "/JANE-MBP_0026BB5C3A91";
+  ASSERT_EQ(symlink((root_ + "/target").c_str(), (base + ".qax").c_str()), 0);
+  ASSERT_EQ(mkfifo((base + "(1).qax").c_str(), 0644), 0);
+  ASSERT_EQ(mkdir((base + "(2).qax").c_str(), 0755), 0);
+  // A hanging agent must fail the test rather than stall it.
+  agent_prefix_ = "timeout 600 ";
+  AgentRun r = run({"-silent"});
+  EXPECT_EQ(r.out, ">>>JANE-MBP_0026BB5C3A91(3).qax\n");
+  EXPECT_EQ(check("JANE-MBP_0026BB5C3A91(3).qax"), "ok");
+  EXPECT_NE(access((root_ + "/target").c_str(), F_OK), 0) << "written through the link";
+  EXPECT_EQ(filesInWork(), (std::vector<std::string>{
+                               "JANE-MBP_0026BB5C3A91(1).qax", "JANE-MBP_0026BB5C3A91(2).qax",
+                               "JANE-MBP_0026BB5C3A91(3).qax", "JANE-MBP_0026BB5C3A91.qax"}));
+}
+
+// A disk that fills up during the save: the message as before, no partial
+// result under any name, the earlier result untouched.
+TEST_F(EndToEndTest, AFailedSaveLeavesNothingBehind) {
+  ASSERT_EQ(reportedName(run({"-silent"})), kSampleName);
+  const std::string earlier = readFile(work_ + "/" + kSampleName);
+  // Files may grow to 8 blocks; past that write() fails as on a full disk.
+  shell_prefix_ = "trap '' XFSZ; ulimit -f 8; ";
+  AgentRun r = run({}, "y\n");
+  EXPECT_EQ(r.exit_code, 0);
+  EXPECT_EQ(r.err, "<dscl_cmd> DS Error: -14136 (eDSRecordNotFound)\nCannot create file :" + work_ +
+                       "/JANE-MBP_0026BB5C3A91(1).qax\n");
+  EXPECT_EQ(r.out.find("Scan finished"), std::string::npos);
+  EXPECT_EQ(filesInWork(), std::vector<std::string>{kSampleName});
+  EXPECT_TRUE(readFile(work_ + "/" + kSampleName) == earlier) << "the earlier result changed";
+}
+
+// One name of 150 MB: every text is cut at 1 MiB on a UTF-8 boundary, so
+// the file stays one that a reader can inflate.
+TEST_F(EndToEndTest, AHugeApplicationNameIsCutToOneMebibyte) {
+  const std::string profiler = copySampleMac() + "/profiler/";
+  std::string huge;
+  huge.reserve(150u << 20);
+  while (huge.size() < (150u << 20)) huge += "\xC3\xA9";  // é
+  replaceOnce(profiler + "SPApplicationsDataType.xml", "<string>Safari</string>",
+              "<string>" + huge + "</string>");
+  huge.clear();
+  huge.shrink_to_fit();
+  AgentRun r = run({"-silent"});
+  ASSERT_EQ(reportedName(r), kSampleName);
+  EXPECT_EQ(check(kSampleName), "ok");
+  QaxFile file = readResult(kSampleName);
+  const QaxNode* software = file.blocks[0].tree.findNode("Software");
+  ASSERT_NE(software, nullptr);
+  size_t found = 0;
+  for (const QaxNode& app : software->children) {
+    if (app.value.size() < 1000) continue;
+    ++found;
+    // "Soft:" is odd, so the name's cut would split an é.
+    EXPECT_EQ(app.name.size(), (1u << 20) - 1);
+    EXPECT_EQ(app.value.size(), 1u << 20);
+    EXPECT_EQ(app.value.compare(app.value.size() - 2, 2, "\xC3\xA9"), 0);
+  }
+  EXPECT_EQ(found, 1u);
 }
 
 }  // namespace

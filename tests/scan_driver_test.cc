@@ -36,12 +36,18 @@ class MemoryDirectory : public ResultDirectory {
  public:
   std::string path() override { return "/results"; }
   bool isTaken(const std::string& full_path) override { return files.count(full_path) != 0; }
-  bool writeFile(const std::string& full_path, const std::vector<uint8_t>& image) override {
-    if (refuse_writes) return false;
+  SaveOutcome writeFile(const std::string& full_path, const std::vector<uint8_t>& image) override {
+    if (refuse_writes) return SaveOutcome::kFailed;
+    // Another program creates these names between the probe and the save.
+    if (raced.erase(full_path)) {
+      files[full_path] = {};
+      return SaveOutcome::kNameTaken;
+    }
     files[full_path] = image;
-    return true;
+    return SaveOutcome::kSaved;
   }
   std::map<std::string, std::vector<uint8_t>> files;
+  std::set<std::string> raced;
   bool refuse_writes = false;
 };
 
@@ -96,11 +102,13 @@ class ScanDriverTest : public ::testing::Test {
 TEST_F(ScanDriverTest, NormalScanWritesTheSnapshotUnderAFreeName) {
   runner_.answer("ls -1 /Users/", "jane\n");
   directory_.files["/results/JANE-MBP_0026BB5C3A91.qax"] = {};
+  directory_.raced = {"/results/JANE-MBP_0026BB5C3A91(1).qax"};
+  directory_.files["/results/JANE-MBP_0026BB5C3A91(2).qax"] = {};
   fakes_.processes.entries = {{1, 0, "launchd"}};
   runner_.answer("ps -p1 -o user=\"\" -o command=\"\"", "root /sbin/launchd\n");
   runScan(false, false, true);
 
-  const std::string path = "/results/JANE-MBP_0026BB5C3A91(1).qax";
+  const std::string path = "/results/JANE-MBP_0026BB5C3A91(3).qax";
   EXPECT_EQ(out_.text().substr(0, 45), "------Start Log------\nI. Collecting Data....\n");
   EXPECT_NE(out_.text().find("VII. Saving to file....done\n------End Log------\n\nScan finished. "
                              "Results saved to file \"" +

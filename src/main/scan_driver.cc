@@ -1,33 +1,22 @@
 #include "main/scan_driver.h"
 
-#include <cctype>
 #include <climits>
 
 #include "collect/command_runner.h"
 #include "collect/profiler_collector.h"
 #include "main/result_directory.h"
+#include "main/result_name.h"
 
 namespace cvn {
 namespace {
 
-// "HOST_ADDR.qax", or "HOST_ADDR(N).qax" for the first N from 1 that is
-// free. The host part is upper-cased, the dashes leave the address. Returns
-// the bare file name; `full_path` gets directory/name.
-std::string chooseResultName(ResultDirectory& directory, const std::string& host,
-                             const std::string& mac_address, std::string* full_path) {
-  std::string host_part;
-  for (char c : host) host_part += static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-  std::string address_part;
-  for (char c : mac_address)
-    if (c != '-') address_part += c;
-  const std::string folder = directory.path();
-  std::string name = host_part + "_" + address_part + ".qax";
-  *full_path = folder + "/" + name;
-  for (int counter = 1; directory.isTaken(*full_path) && counter < INT_MAX; ++counter) {
-    name = host_part + "_" + address_part + "(" + std::to_string(counter) + ").qax";
-    *full_path = folder + "/" + name;
-  }
-  return name;
+// The first name from "HOST_ADDR.qax", "HOST_ADDR(1).qax", ... from
+// `counter` on that nothing bears; the last counter is used even if taken.
+int nextFreeCounter(ResultDirectory& directory, const std::string& folder,
+                    const ResultName& result_name, int counter) {
+  while (counter < INT_MAX && directory.isTaken(folder + "/" + result_name.fileName(counter)))
+    ++counter;
+  return counter;
 }
 
 }  // namespace
@@ -77,11 +66,22 @@ void ScanDriver::run(const OutputSettings& output, const ScanOptions& options) {
 void ScanDriver::saveAndReport(const std::vector<uint8_t>& image, bool logging, bool silent,
                                const std::string& host, const std::string& mac_address) {
   log(logging, "VI. Generating File name....");
-  std::string full_path;
-  std::string name = chooseResultName(tools_.directory, host, mac_address, &full_path);
+  const std::string folder = tools_.directory.path();
+  const ResultName result_name = makeResultName(host, mac_address);
+  int counter = nextFreeCounter(tools_.directory, folder, result_name, 0);
   log(logging, "done\n");
   log(logging, "VII. Saving to file....");
-  bool saved = tools_.directory.writeFile(full_path, image);
+  std::string name = result_name.fileName(counter);
+  std::string full_path = folder + "/" + name;
+  SaveOutcome outcome = tools_.directory.writeFile(full_path, image);
+  // Something took the name since the probe: on to the next free one.
+  while (outcome == SaveOutcome::kNameTaken && counter < INT_MAX) {
+    counter = nextFreeCounter(tools_.directory, folder, result_name, counter + 1);
+    name = result_name.fileName(counter);
+    full_path = folder + "/" + name;
+    outcome = tools_.directory.writeFile(full_path, image);
+  }
+  const bool saved = outcome == SaveOutcome::kSaved;
   log(logging, "done\n");
   log(logging, "------End Log------\n");
   if (!saved) {
