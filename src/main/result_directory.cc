@@ -44,7 +44,12 @@ class HeldSignals {
     for (int s : kCleanupSignals) sigaddset(&set, s);
     sigprocmask(SIG_BLOCK, &set, &old_);
   }
-  ~HeldSignals() { sigprocmask(SIG_SETMASK, &old_, nullptr); }
+  // Keeps errno: callers read it after the step this scope guarded.
+  ~HeldSignals() {
+    int error = errno;
+    sigprocmask(SIG_SETMASK, &old_, nullptr);
+    errno = error;
+  }
   HeldSignals(const HeldSignals&) = delete;
   HeldSignals& operator=(const HeldSignals&) = delete;
 
