@@ -106,7 +106,7 @@ if CXX=clang++ build build-fuzz -DCMAKE_BUILD_TYPE=RelWithDebInfo -DCVN_FUZZ=ON 
       report 0 1
       echo "-- $name failed; its output is in $log"
     fi
-    grep -E '^#[0-9]+ +(DONE|INITED)|stat::number_of_executed_units|deadly|ERROR' "$log" | tail -n 4
+    grep -aE '^#[0-9]+ +(DONE|INITED)|stat::number_of_executed_units|deadly|ERROR' "$log" | tail -n 4
     rm -rf "$work"
   done
 fi
