@@ -91,14 +91,18 @@ void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::strin
   log(logging, "------Start Log------\n");
   log(logging, "I. Collecting Data....\n");
   std::vector<size_t> part_ends;
-  std::string document = ProfilerCollector(tools_.runner).collect(logging, tools_.out, &part_ends);
+  ProfilerCollector collector(tools_.runner);
+  std::string document = collector.collect(logging, tools_.out, &part_ends);
+  std::vector<std::string> extra_documents = collector.collectExtraTypes();
   log(logging, "done\n");
 
   // A document that cannot be read leaves the trees without profiler data;
   // the scan still writes its file.
   PlistValue plist;
   parseCollectedDocument(document, part_ends, &plist);
+  addExtraTypes(extra_documents, &plist);
   document = std::string();
+  extra_documents.clear();
 
   QuickFacts facts = readQuickFacts(plist, tools_.runner);
   auto raw = std::make_unique<TagTree>(native, "Macintosh");
