@@ -3,8 +3,10 @@
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
+#include <optional>
 
 #include "collect/command_runner.h"
+#include "collect/processor_text.h"
 #include "sections/edid.h"
 #include "zxml/size_text.h"
 
@@ -45,6 +47,8 @@ std::string integerText(const PlistValue* dict, std::string_view key) {
   const PlistValue* v = dict->find(key);
   if (!v) return std::string();
   if (v->kind == PlistValue::Kind::kInteger) return std::to_string(v->integer);
+  if (std::optional<int64_t> cores = v->isString() ? coreCountOfProcText(v->text) : std::nullopt)
+    return std::to_string(*cores);
   if (v->isString()) return v->text;
   return std::string();
 }
@@ -123,19 +127,27 @@ QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
     const PlistValue* packages = hardware->find("packages");
     if (packages && packages->kind == PlistValue::Kind::kInteger) {
       facts.package_count = std::to_string(static_cast<unsigned>(packages->integer));
+    } else if (!packages && hardware->find("chip_type")) {
+      // One chip, as the Processors section records it.
+      facts.package_count = "1";
     }
   }
   facts.processor_count = integerText(hardware, "number_processors");
   std::string speed = stringAt(hardware, "current_processor_speed");
   if (!speed.empty()) {
-    double number = std::atof(firstWord(speed).c_str());
+    std::string first = firstWord(speed);
+    // The profiler follows the locale: "2,3 GHz" has a decimal comma.
+    for (char& c : first)
+      if (c == ',') c = '.';
+    double number = std::atof(first.c_str());
     // Old profilers print "2.26 GHz", very old ones "867 MHz".
     facts.processor_speed =
         wholeNumber(speed.find("MHz") != std::string::npos ? number : number * 1000);
   }
   facts.processor_model = stringAt(hardware, "cpu_type");
-  if (facts.processor_model.find("Intel") != std::string::npos)
-    facts.processor_maker = "GenuineIntel";
+  if (hardware && !hardware->find("cpu_type"))
+    facts.processor_model = stringAt(hardware, "chip_type");
+  facts.processor_maker = processorMakerOf(facts.processor_model);
   facts.machine_model = stringAt(hardware, "machine_model");
   facts.system_maker = "Apple Inc.";
   std::string memory = stringAt(hardware, "physical_memory");
