@@ -72,5 +72,21 @@ TEST(QuickFactsTest, LateIntelWithADecimalCommaAndEveryOlderForm) {
   }
 }
 
+TEST(QuickFactsTest, DiskCapacityCountsNvmeDisksButNotTheirContainers) {
+  const std::string sata =
+      "<dict><key>_items</key><array><dict><key>size</key><string>500,11 GB</string>"
+      "<key>volumes</key><array><dict><key>size</key><string>400 GB</string>"
+      "<key>free_space</key><string>100 GB</string></dict></array></dict></array></dict>";
+  const std::string nvme =
+      "<dict><key>_items</key><array><dict><key>size</key><string>1 TB</string>"
+      "<key>volumes</key><array><dict><key>size</key><string>994.66 GB</string></dict>"
+      "</array></dict></array></dict>";
+  std::string both =
+      factsText(profilerList({{"SPSerialATADataType", sata}, {"SPNVMeDataType", nvme}}));
+  EXPECT_EQ(both.substr(both.find("disks=")), "disks=1500.1\nvolumes=400.0\nfree=100.0\n");
+  std::string nvme_only = factsText(profilerList({{"SPNVMeDataType", nvme}}));
+  EXPECT_EQ(nvme_only.substr(nvme_only.find("disks=")), "disks=1000.0\nvolumes=\nfree=\n");
+}
+
 }  // namespace
 }  // namespace cvn

@@ -78,24 +78,32 @@ void readDisplays(const PlistValue& root, QuickFacts* facts) {
 }
 
 void readDisks(const PlistValue& root, QuickFacts* facts) {
-  const PlistValue* controllers = findProfilerItems(root, "SPSerialATADataType");
-  if (!controllers) return;
   double disks = 0, volumes = 0, free = 0;
   bool any_disk = false, any_volume = false;
-  for (const PlistValue& controller : controllers->array) {
-    const PlistValue* devices = controller.find("_items");
-    if (!devices || !devices->isArray()) continue;
-    for (const PlistValue& device : devices->array) {
-      std::string size = stringAt(&device, "size");
-      if (size.empty()) continue;
-      disks += SizeText::toGigabytes(size);
-      any_disk = true;
-      const PlistValue* vols = device.find("volumes");
-      if (!vols || !vols->isArray()) continue;
-      for (const PlistValue& volume : vols->array) {
-        volumes += SizeText::toGigabytes(stringAt(&volume, "size"));
-        free += SizeText::toGigabytes(stringAt(&volume, "free_space"));
-        any_volume = true;
+  // NVMe disks are listed like SATA ones; their volumes are APFS containers
+  // without free space, which say nothing about the volumes in them.
+  const struct {
+    const char* data_type;
+    bool with_volumes;
+  } kDiskTypes[] = {{"SPSerialATADataType", true}, {"SPNVMeDataType", false}};
+  for (const auto& [data_type, with_volumes] : kDiskTypes) {
+    const PlistValue* controllers = findProfilerItems(root, data_type);
+    if (!controllers) continue;
+    for (const PlistValue& controller : controllers->array) {
+      const PlistValue* devices = controller.find("_items");
+      if (!devices || !devices->isArray()) continue;
+      for (const PlistValue& device : devices->array) {
+        std::string size = stringAt(&device, "size");
+        if (size.empty()) continue;
+        disks += SizeText::toGigabytes(size);
+        any_disk = true;
+        const PlistValue* vols = with_volumes ? device.find("volumes") : nullptr;
+        if (!vols || !vols->isArray()) continue;
+        for (const PlistValue& volume : vols->array) {
+          volumes += SizeText::toGigabytes(stringAt(&volume, "size"));
+          free += SizeText::toGigabytes(stringAt(&volume, "free_space"));
+          any_volume = true;
+        }
       }
     }
   }
