@@ -88,5 +88,35 @@ TEST(QuickFactsTest, DiskCapacityCountsNvmeDisksButNotTheirContainers) {
   EXPECT_EQ(nvme_only.substr(nvme_only.find("disks=")), "disks=1000.0\nvolumes=\nfree=\n");
 }
 
+TEST(QuickFactsTest, MainDisplayOfToday) {
+  auto display = [](const std::string& keys) {
+    return profilerList(
+        {{"SPDisplaysDataType",
+          "<dict><key>sppci_model</key><string>Apple M3 Pro</string>"
+          "<key>spdisplays_ndrvs</key><array><dict><key>_name</key><string>LG</string>"
+          "<key>_spdisplays_resolution</key><string>3840 x 2160 @ 60.00Hz</string></dict>"
+          "<dict>" +
+              keys +
+              "<key>spdisplays_main</key><string>spdisplays_yes</string></dict>"
+              "</array></dict>"}});
+  };
+  const std::pair<std::string, const char*> cases[] = {
+      {"<key>_spdisplays_resolution</key><string>1512 x 982 @ 120.00Hz</string>"
+       "<key>_spdisplays_pixels</key><string>3024 x 1964</string>",
+       "vram=\nresolution=1512 x 982 @ 120.00Hz\ndiagonal=\n"},
+      {"<key>_spdisplays_pixels</key><string>3024 x 1964</string>",
+       "vram=\nresolution=3024 x 1964\ndiagonal=\n"},
+      // The older key wins, even when it says nothing.
+      {"<key>spdisplays_resolution</key><string></string>"
+       "<key>_spdisplays_resolution</key><string>1512 x 982 @ 120.00Hz</string>",
+       "vram=\nresolution=\ndiagonal=\n"},
+  };
+  for (const auto& [keys, expected] : cases) {
+    std::string text = factsText(display(keys));
+    size_t from = text.find("vram="), to = text.find("disks=");
+    EXPECT_EQ(text.substr(from, to - from), expected) << keys;
+  }
+}
+
 }  // namespace
 }  // namespace cvn

@@ -53,6 +53,16 @@ std::string integerText(const PlistValue* dict, std::string_view key) {
   return std::string();
 }
 
+// Where the older key is missing, today's profilers give the resolution
+// under another key, or only the panel's pixels.
+std::string displayResolution(const PlistValue& display) {
+  for (const char* key :
+       {"spdisplays_resolution", "_spdisplays_resolution", "_spdisplays_pixels"}) {
+    if (display.find(key)) return stringAt(&display, key);
+  }
+  return std::string();
+}
+
 void readDisplays(const PlistValue& root, QuickFacts* facts) {
   const PlistValue* items = findProfilerItems(root, "SPDisplaysDataType");
   if (!items) return;
@@ -70,7 +80,7 @@ void readDisplays(const PlistValue& root, QuickFacts* facts) {
     if (!displays || !displays->isArray()) continue;
     for (const PlistValue& display : displays->array) {
       if (stringAt(&display, "spdisplays_main") != "spdisplays_yes") continue;
-      facts->main_display_resolution = stringAt(&display, "spdisplays_resolution");
+      facts->main_display_resolution = displayResolution(display);
       facts->main_display_size = edidDiagonalText(stringAt(&display, "_spdisplays_edid"));
       return;
     }
