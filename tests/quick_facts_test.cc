@@ -34,7 +34,7 @@ std::string factsText(const std::string& list) {
          "\nspeed=" + f.processor_speed + "\nmodel=" + f.processor_model +
          "\nmaker=" + f.processor_maker + "\nmemory=" + f.physical_memory +
          "\nvram=" + f.video_memory + "\nresolution=" + f.main_display_resolution +
-         "\ndiagonal=" + f.main_display_size + "\ndisks=" + f.disk_capacity +
+         "\nedid=" + f.main_display_edid + "\ndisks=" + f.disk_capacity +
          "\nvolumes=" + f.volume_capacity + "\nfree=" + f.volume_free + "\n";
 }
 
@@ -44,7 +44,7 @@ TEST(QuickFactsTest, AppleSiliconChipCoresAndMaker) {
                                      "<key>number_processors</key><string>proc 12:6:6</string>"
                                      "<key>physical_memory</key><string>18 GB</string></dict>"}})),
             "packages=1\ncores=12\nspeed=\nmodel=Apple M3 Pro\nmaker=Apple Inc.\nmemory=18432\n"
-            "vram=\nresolution=\ndiagonal=\ndisks=\nvolumes=\nfree=\n");
+            "vram=\nresolution=\nedid=\ndisks=\nvolumes=\nfree=\n");
 }
 
 TEST(QuickFactsTest, LateIntelWithADecimalCommaAndEveryOlderForm) {
@@ -103,13 +103,13 @@ TEST(QuickFactsTest, MainDisplayOfToday) {
   const std::pair<std::string, const char*> cases[] = {
       {"<key>_spdisplays_resolution</key><string>1512 x 982 @ 120.00Hz</string>"
        "<key>_spdisplays_pixels</key><string>3024 x 1964</string>",
-       "vram=\nresolution=1512 x 982 @ 120.00Hz\ndiagonal=\n"},
+       "vram=\nresolution=1512 x 982 @ 120.00Hz\nedid=\n"},
       {"<key>_spdisplays_pixels</key><string>3024 x 1964</string>",
-       "vram=\nresolution=3024 x 1964\ndiagonal=\n"},
+       "vram=\nresolution=3024 x 1964\nedid=\n"},
       // The older key wins, even when it says nothing.
       {"<key>spdisplays_resolution</key><string></string>"
        "<key>_spdisplays_resolution</key><string>1512 x 982 @ 120.00Hz</string>",
-       "vram=\nresolution=\ndiagonal=\n"},
+       "vram=\nresolution=\nedid=\n"},
   };
   for (const auto& [keys, expected] : cases) {
     std::string text = factsText(display(keys));

@@ -151,10 +151,11 @@ void addExtraTypes(const std::vector<std::string>& documents, PlistValue* root) 
 }
 
 bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
-                            PlistValue* out) {
-  std::string warning;
-  bool read = parsePlist(document, out, &warning);
-  if (warning.empty() || part_ends.size() < 2) return read;
+                            PlistValue* out, std::string* warning) {
+  std::string problem;
+  bool read = parsePlist(document, out, &problem);
+  if (warning) *warning = problem;
+  if (problem.empty() || part_ends.size() < 2) return read;
 
   PlistValue merged;
   merged.kind = PlistValue::Kind::kArray;
