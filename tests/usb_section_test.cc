@@ -126,8 +126,9 @@ TEST(UsbSectionTest, WalksNestedHubsUpToABound) {
             "+Peripherals=\n+USB=\n*Device:1=\"Keyboard\"\n-\n-\n");
 }
 
-// Today's profilers: the stick's disk sits in a "Media" list, and its volume
-// is already among the mounted volumes of the disk section.
+// Today's profilers: the stick's disk sits in a "Media" list, with a
+// decimal size text beside its byte count, and its volume is already among
+// the mounted volumes of the disk section.
 TEST(UsbSectionTest, AStickWhoseDiskSitsInAMediaList) {
   TagTree raw(true, "Macintosh");
   raw.setValue("/SPUSBDataType/_items/item0/host_controller", TagValue("AppleT6000USBXHCI"));
@@ -144,8 +145,8 @@ TEST(UsbSectionTest, AStickWhoseDiskSitsInAMediaList) {
           {{"_name", TagValue("HARMONY MSC")},
            {"bsd_name", TagValue("disk8")},
            {"removable_media", TagValue("yes")},
-           {"size", TagValue("3,91 GB")},
-           {"size_in_bytes", TagValue(int64_t{3910139904})},
+           {"size", TagValue("30,75 GB")},
+           {"size_in_bytes", TagValue(int64_t{30752636928})},
            {"smart_status", TagValue("Verified")}});
   const std::vector<std::pair<const char*, TagValue>> volume = {
       {"_name", TagValue("STICK")},
@@ -206,8 +207,8 @@ device-speed="2"
 manufacturer="SanDisk"
 serial="4C530001"
 model="HARMONY MSC"
-size=4
-~base-value=3910139904
+size=31
+~base-value=30752636928
 interface="USB"
 partitions=1
 *Removable:2="Cruzer"

@@ -179,8 +179,8 @@ class UsbWriter {
     Tag& disk = physical.addChild(physical.nextNumberedName("Removable:"));
     if (const TagValue* name = rawValue(device, "_name")) disk.setValue(*name);
     disk.setProperty("media-type", TagValue("2"));
-    writeRemovableKeys(disk, device);
-    if (&medium != &device) writeRemovableKeys(disk, medium);
+    writeRemovableKeys(disk, device, false);
+    if (&medium != &device) writeRemovableKeys(disk, medium, true);
     disk.setProperty("interface", TagValue("USB"));
     int64_t partitions = 0;
     if (const Tag* volumes = medium.findChild("volumes")) {
@@ -191,7 +191,9 @@ class UsbWriter {
     disk.setProperty("partitions", TagValue(partitions));
   }
 
-  void writeRemovableKeys(Tag& disk, const Tag& device) {
+  // `in_media_list`: the keys of a "Media" entry, whose size texts are
+  // decimal, so its byte count is the better source.
+  void writeRemovableKeys(Tag& disk, const Tag& device, bool in_media_list) {
     for (const auto& prop : device.properties()) {
       std::string_view key = descriptorKey(prop->name());
       const TagValue& value = prop->value();
@@ -210,15 +212,23 @@ class UsbWriter {
       } else if (key == "bus_power_used") {
         disk.setProperty("bus-power-used", value);
       } else if (key == "size") {
-        writeRemovableSize(disk, device, value);
+        writeRemovableSize(disk, device, value, in_media_list);
       } else if (key == "bsd_name") {
         writeMediaName(disk, value.text());
       }
     }
   }
 
-  static void writeRemovableSize(Tag& disk, const Tag& device, const TagValue& size) {
+  static void writeRemovableSize(Tag& disk, const Tag& device, const TagValue& size,
+                                 bool in_media_list) {
     double gigabytes = SizeText::toDecimalGigabytes(size.text(), true);
+    const TagValue* count = rawValue(device, "size_in_bytes");
+    if (in_media_list && count && count->isInt()) {
+      // Rounded as the text is: a fraction above .4 counts up.
+      double exact = bytesToDecimalGigabytes(count->asInt());
+      gigabytes = static_cast<double>(truncateToInt64(exact));
+      if (exact - gigabytes > 0.4) gigabytes += 1.0;
+    }
     TagValue whole(truncateToInt64(gigabytes));
     if (const TagValue* bytes = rawValue(device, "size_in_bytes")) {
       std::string base = formatText("%lld", static_cast<long long>(rawBytes(*bytes)));
