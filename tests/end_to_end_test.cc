@@ -301,6 +301,26 @@ TEST_F(EndToEndTest, TheSampleMacGivesTheCommittedResult) {
                         kSource + "/tests/sample_mac/expected_result.txt");
 }
 
+// An Apple Silicon MacBook Pro on macOS 15: NVMe disk, APFS volumes, unified
+// memory, a USB stick in a Media list, an external main display.
+TEST_F(EndToEndTest, TheModernMacGivesTheCommittedResult) {
+  mac_dir_ = kSource + "/tests/modern_mac";
+  const std::string profiler_log = root_ + "/profiler.log";
+  AgentRun r = run({"-silent"}, "", "FAKE_PROFILER_LOG=" + quote(profiler_log));
+  // No NetBIOS name on today's Macs: the computer's own name leads.
+  const std::string name = hostNamePart() + "_F4D4886A1CE2.qax";
+  ASSERT_EQ(r.out, ">>>" + name + "\n");
+  expectSameAsCommitted(stableResultText(readResult(name)),
+                        kSource + "/tests/modern_mac/expected_result.txt");
+  // The newer types come once each, after the others.
+  std::string asked = readFile(profiler_log);
+  EXPECT_EQ(asked.substr(asked.find("SPPowerDataType")),
+            "SPPowerDataType\n"
+            "-detailLevel full -xml SPNVMeDataType\n"
+            "-detailLevel full -xml SPStorageDataType\n"
+            "-detailLevel full -xml SPUSBHostDataType\n");
+}
+
 TEST_F(EndToEndTest, DebugScanKeepsTheProfilersWholeOutput) {
   ASSERT_EQ(run({"-debug", "-silent"}).out, ">>>" + kSampleName + "\n");
   QaxFile file = readResult(kSampleName);
