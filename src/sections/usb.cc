@@ -1,6 +1,10 @@
 // USB devices: removable storage joins the disks under "Storage" (asking
 // diskutil for its media name), every other device goes under
-// "Peripherals"/"USB". Hubs are walked through, not recorded.
+// "Peripherals"/"USB". Hubs are walked through, not recorded. From macOS 26
+// the devices are only in the USB host data type, which has its own keys.
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -48,6 +52,30 @@ std::optional<std::string> findMediaName(const std::string& diskutil_output) {
   return trimText(std::string_view(diskutil_output).substr(start, end - start), " \n\r", kTrimBoth);
 }
 
+// The megabits per second of a link speed text of the USB host type ("12
+// Mb/s", "5 Gb/s", "USB 2.0 (480 Mb/s)"): the first number followed by a
+// rate unit, as text. Nothing for a form that says no rate.
+std::optional<std::string> linkSpeedMegabits(std::string_view text) {
+  constexpr std::string_view kDigits = "0123456789";
+  for (size_t start = text.find_first_of(kDigits); start != std::string_view::npos;) {
+    size_t end = std::min(text.find_first_not_of("0123456789.,", start), text.size());
+    std::string number(text.substr(start, end - start));
+    for (char& c : number)
+      if (c == ',') c = '.';
+    std::string_view unit = text.substr(end);
+    unit.remove_prefix(std::min(unit.find_first_not_of(' '), unit.size()));
+    double rate = std::strtod(number.c_str(), nullptr);
+    if (unit.substr(0, 2) == "Gb") rate *= 1000;
+    if ((unit.substr(0, 2) == "Gb" || unit.substr(0, 2) == "Mb") && rate > 0 && rate < 1e9) {
+      char buffer[32];
+      std::snprintf(buffer, sizeof buffer, "%.10g", rate);
+      return std::string(buffer);
+    }
+    start = text.find_first_of(kDigits, end);
+  }
+  return std::nullopt;
+}
+
 class UsbWriter {
  public:
   UsbWriter(Tag& top, CommandRunner& runner) : top_(top), runner_(runner) {}
@@ -55,7 +83,12 @@ class UsbWriter {
   void addDevice(const Tag& device, int depth = 0) {
     const TagValue* removable = rawValue(device, "removable_media");
     if (removable && removable->isText() && removable->text() == "yes") {
-      addRemovable(device);
+      addRemovable(device, device);
+      return;
+    }
+    // Today's profilers keep a storage device's disks in a "Media" list.
+    if (const Tag* media = device.findChild("Media"); media && !media->children().empty()) {
+      for (const auto& medium : media->children()) addRemovable(device, *medium);
       return;
     }
     if (const Tag* children = device.findChild("_items")) {
@@ -65,6 +98,40 @@ class UsbWriter {
       return;
     }
     addPeripheral(device);
+  }
+
+  /// A device of the USB host type; hubs are walked through.
+  void addHostDevice(const Tag& device, int depth = 0) {
+    if (const Tag* children = device.findChild("_items")) {
+      if (depth < kMaxHubDepth) {
+        for (const auto& child : children->children()) addHostDevice(*child, depth + 1);
+      }
+      return;
+    }
+    Tag& record = top_.addChild("Peripherals")
+                      .addChild("USB")
+                      .addChild(formatText("Device:%d", devices_ + 1));
+    if (const TagValue* name = rawValue(device, "_name")) record.setValue(*name);
+    for (const auto& prop : device.properties()) {
+      std::string_view key = prop->name();
+      const TagValue& value = prop->value();
+      if (key == "USBDeviceKeyProductID") {
+        record.setProperty("product-id", value);
+      } else if (key == "USBDeviceKeyVendorID") {
+        record.setProperty("vendor-id", value);
+      } else if (key == "USBDeviceKeyProductVersion") {
+        record.setProperty("bcd-device", value);
+      } else if (key == "USBDeviceKeySerialNumber") {
+        record.setProperty("serial-number", value);
+      } else if (key == "USBDeviceKeyLinkSpeed") {
+        if (std::optional<std::string> speed = linkSpeedMegabits(value.text())) {
+          record.setProperty("device-speed", TagValue(*speed));
+        }
+      } else if (key == "USBDeviceKeyVendorName") {
+        record.setProperty("manuf", value);
+      }
+    }
+    ++devices_;
   }
 
  private:
@@ -105,11 +172,28 @@ class UsbWriter {
     ++devices_;
   }
 
-  void addRemovable(const Tag& device) {
+  // `medium` holds the size, the disk's name and the volumes: the device
+  // itself on older profilers, an entry of its "Media" list on today's.
+  void addRemovable(const Tag& device, const Tag& medium) {
     Tag& physical = top_.addChild("Storage").addChild("Physical-disks");
     Tag& disk = physical.addChild(physical.nextNumberedName("Removable:"));
     if (const TagValue* name = rawValue(device, "_name")) disk.setValue(*name);
     disk.setProperty("media-type", TagValue("2"));
+    writeRemovableKeys(disk, device, false);
+    if (&medium != &device) writeRemovableKeys(disk, medium, true);
+    disk.setProperty("interface", TagValue("USB"));
+    int64_t partitions = 0;
+    if (const Tag* volumes = medium.findChild("volumes")) {
+      for (const auto& volume : volumes->children()) {
+        if (addVolume(*volume)) ++partitions;
+      }
+    }
+    disk.setProperty("partitions", TagValue(partitions));
+  }
+
+  // `in_media_list`: the keys of a "Media" entry, whose size texts are
+  // decimal, so its byte count is the better source.
+  void writeRemovableKeys(Tag& disk, const Tag& device, bool in_media_list) {
     for (const auto& prop : device.properties()) {
       std::string_view key = descriptorKey(prop->name());
       const TagValue& value = prop->value();
@@ -128,23 +212,23 @@ class UsbWriter {
       } else if (key == "bus_power_used") {
         disk.setProperty("bus-power-used", value);
       } else if (key == "size") {
-        writeRemovableSize(disk, device, value);
+        writeRemovableSize(disk, device, value, in_media_list);
       } else if (key == "bsd_name") {
         writeMediaName(disk, value.text());
       }
     }
-    disk.setProperty("interface", TagValue("USB"));
-    int64_t partitions = 0;
-    if (const Tag* volumes = device.findChild("volumes")) {
-      for (const auto& volume : volumes->children()) {
-        if (addVolume(*volume)) ++partitions;
-      }
-    }
-    disk.setProperty("partitions", TagValue(partitions));
   }
 
-  static void writeRemovableSize(Tag& disk, const Tag& device, const TagValue& size) {
+  static void writeRemovableSize(Tag& disk, const Tag& device, const TagValue& size,
+                                 bool in_media_list) {
     double gigabytes = SizeText::toDecimalGigabytes(size.text(), true);
+    const TagValue* count = rawValue(device, "size_in_bytes");
+    if (in_media_list && count && count->isInt()) {
+      // Rounded as the text is: a fraction above .4 counts up.
+      double exact = bytesToDecimalGigabytes(count->asInt());
+      gigabytes = static_cast<double>(truncateToInt64(exact));
+      if (exact - gigabytes > 0.4) gigabytes += 1.0;
+    }
     TagValue whole(truncateToInt64(gigabytes));
     if (const TagValue* bytes = rawValue(device, "size_in_bytes")) {
       std::string base = formatText("%lld", static_cast<long long>(rawBytes(*bytes)));
@@ -165,9 +249,12 @@ class UsbWriter {
   }
 
   // Volumes the profiler lists without free space (not mounted) are left out.
+  // One that the mounted volumes of the disk section already hold is counted
+  // but not written again.
   bool addVolume(const Tag& volume) {
     if (!hasKey(volume, "_name") || !hasKey(volume, "free_space")) return false;
     Tag& logical = top_.addChild("Storage").addChild("Logical-disks");
+    if (isMountedAlready(logical, rawText(volume, "mount_point"))) return true;
     Tag& partition = logical.setChildValue(logical.nextNumberedName("partition:"),
                                            TagValue(rawText(volume, "_name")));
     writeFileSystem(partition, volume);
@@ -178,6 +265,15 @@ class UsbWriter {
     return true;
   }
 
+  static bool isMountedAlready(const Tag& logical, const std::string& mount_point) {
+    if (mount_point.empty()) return false;
+    for (const auto& partition : logical.children()) {
+      const TagProperty* known = partition->findProperty("mount-point");
+      if (known && known->value().isText() && known->value().text() == mount_point) return true;
+    }
+    return false;
+  }
+
   Tag& top_;
   CommandRunner& runner_;
   int devices_ = 0;
@@ -186,13 +282,26 @@ class UsbWriter {
 }  // namespace
 
 void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner) {
-  const Tag* buses = findItems(raw, "SPUSBDataType");
-  if (!buses) return;
   UsbWriter writer(snapshot.top(), runner);
-  for (const auto& bus : buses->children()) {
+  bool any_device = false;
+  if (const Tag* buses = findItems(raw, "SPUSBDataType")) {
+    for (const auto& bus : buses->children()) {
+      const Tag* devices = bus->findChild("_items");
+      if (!devices) continue;
+      for (const auto& device : devices->children()) {
+        writer.addDevice(*device);
+        any_device = true;
+      }
+    }
+  }
+  // macOS 26 and later leave the older type empty.
+  if (any_device) return;
+  const Tag* host_buses = findItems(raw, "SPUSBHostDataType");
+  if (!host_buses) return;
+  for (const auto& bus : host_buses->children()) {
     const Tag* devices = bus->findChild("_items");
     if (!devices) continue;
-    for (const auto& device : devices->children()) writer.addDevice(*device);
+    for (const auto& device : devices->children()) writer.addHostDevice(*device);
   }
 }
 

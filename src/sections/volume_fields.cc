@@ -66,6 +66,22 @@ VolumeSpace writeVolumeSpace(Tag& partition, const Tag& volume) {
   return space;
 }
 
+VolumeSpace writeMountedVolumeSpace(Tag& partition, const Tag& volume) {
+  VolumeSpace space;
+  if (hasKey(volume, "size_in_bytes") || hasKey(volume, "size")) {
+    SizeReading total = readVolumeSize(volume, "size_in_bytes", "size");
+    space.total_gb = total.gigabytes;
+    writeSize(partition, "size", total);
+  }
+  if (hasKey(volume, "free_space_in_bytes") || hasKey(volume, "free_space")) {
+    SizeReading free = readVolumeSize(volume, "free_space_in_bytes", "free_space");
+    space.free_known = true;
+    space.free_gb = free.gigabytes;
+    writeSize(partition, "free", free);
+  }
+  return space;
+}
+
 void writeUsedPercent(Tag& partition, const VolumeSpace& space) {
   if (!space.free_known || space.total_gb == 0.0) return;
   double used = space.total_gb - space.free_gb;
