@@ -147,39 +147,42 @@ class StorageWriter {
 
 const Tag* childItems(const Tag& tag) { return tag.findChild("_items"); }
 
+// Each entry of the "_items" list of each entry of `parents`: the disks of
+// controllers and buses.
+template <typename Visit>
+void forEachItemBelow(const Tag& parents, Visit visit) {
+  for (const auto& parent : parents.children()) {
+    if (const Tag* items = childItems(*parent)) {
+      for (const auto& item : items->children()) visit(*item);
+    }
+  }
+}
+
 // SATA and NVMe list their disks alike, under controllers.
 void addControllerDisks(StorageWriter& writer, const TagTree& raw, DiskBus bus) {
   const Tag* controllers =
       findItems(raw, bus == DiskBus::kNvme ? "SPNVMeDataType" : "SPSerialATADataType");
   if (!controllers) return;
-  for (const auto& controller : controllers->children()) {
-    const Tag* devices = childItems(*controller);
-    if (!devices) continue;
-    for (const auto& device : devices->children()) {
-      const TagValue* smart = rawValue(*device, "smart_status");
-      // Optical drives report no SMART status, or "Not Supported".
-      if (!smart || (smart->isText() && smart->text() == "Not Supported")) {
-        writer.addDrive(*device);
-      } else {
-        writer.addDisk(*device, bus);
-      }
+  forEachItemBelow(*controllers, [&](const Tag& device) {
+    const TagValue* smart = rawValue(device, "smart_status");
+    // Optical drives report no SMART status, or "Not Supported".
+    if (!smart || (smart->isText() && smart->text() == "Not Supported")) {
+      writer.addDrive(device);
+    } else {
+      writer.addDisk(device, bus);
     }
-  }
+  });
 }
 
 void addParallelScsi(StorageWriter& writer, const TagTree& raw) {
   const Tag* cards = findItems(raw, "SPParallelSCSIDataType");
   if (!cards) return;
-  for (const auto& card : cards->children()) {
-    const Tag* buses = childItems(*card);
-    if (!buses) continue;
-    for (const auto& bus : buses->children()) {
-      const Tag* devices = childItems(*bus);
-      if (!devices) continue;
+  forEachItemBelow(*cards, [&](const Tag& bus) {
+    if (const Tag* devices = childItems(bus)) {
       for (const auto& device : devices->children())
         writer.addDisk(*device, DiskBus::kParallelScsi);
     }
-  }
+  });
 }
 
 void addMountedVolumes(StorageWriter& writer, const TagTree& raw) {
@@ -191,11 +194,7 @@ void addMountedVolumes(StorageWriter& writer, const TagTree& raw) {
 void addParallelAta(StorageWriter& writer, const TagTree& raw) {
   const Tag* buses = findItems(raw, "SPParallelATADataType");
   if (!buses) return;
-  for (const auto& bus : buses->children()) {
-    const Tag* devices = childItems(*bus);
-    if (!devices) continue;
-    for (const auto& device : devices->children()) writer.addDrive(*device);
-  }
+  forEachItemBelow(*buses, [&](const Tag& device) { writer.addDrive(device); });
 }
 
 }  // namespace

@@ -29,6 +29,31 @@ constexpr std::string_view kDescriptorKeys[] = {"product_id", "vendor_id",     "
                                                 "serial_num", "device_speed",  "manufacturer",
                                                 "bus_power",  "bus_power_used"};
 
+// Raw keys and the fields (or texts) they give.
+struct KeyText {
+  std::string_view key;
+  const char* text;
+};
+
+constexpr KeyText kDeviceFields[] = {
+    {"product_id", "product-id"},        {"vendor_id", "vendor-id"}, {"bcd_device", "bcd-device"},
+    {"serial_num", "serial-number"},     {"manufacturer", "manuf"},  {"bus_power", "bus-power"},
+    {"bus_power_used", "bus-power-used"}};
+constexpr KeyText kHostDeviceFields[] = {{"USBDeviceKeyProductID", "product-id"},
+                                         {"USBDeviceKeyVendorID", "vendor-id"},
+                                         {"USBDeviceKeyProductVersion", "bcd-device"},
+                                         {"USBDeviceKeySerialNumber", "serial-number"},
+                                         {"USBDeviceKeyVendorName", "manuf"}};
+constexpr KeyText kSpeedMegabits[] = {
+    {"full_speed", "12"}, {"low_speed", "1.5"}, {"high_speed", "480"}};
+
+template <size_t N>
+const char* fieldFor(const KeyText (&table)[N], std::string_view key) {
+  for (const KeyText& entry : table)
+    if (entry.key == key) return entry.text;
+  return nullptr;
+}
+
 // The profilers of 10.5 and 10.6 sort the USB descriptor keys by a letter
 // prefix ("a_product_id", "h_bus_power"); behind it is the key that later
 // profilers write plainly.
@@ -108,68 +133,39 @@ class UsbWriter {
       }
       return;
     }
-    Tag& record = top_.addChild("Peripherals")
-                      .addChild("USB")
-                      .addChild(formatText("Device:%d", devices_ + 1));
-    if (const TagValue* name = rawValue(device, "_name")) record.setValue(*name);
+    Tag& record = addDeviceRecord(device);
     for (const auto& prop : device.properties()) {
       std::string_view key = prop->name();
-      const TagValue& value = prop->value();
-      if (key == "USBDeviceKeyProductID") {
-        record.setProperty("product-id", value);
-      } else if (key == "USBDeviceKeyVendorID") {
-        record.setProperty("vendor-id", value);
-      } else if (key == "USBDeviceKeyProductVersion") {
-        record.setProperty("bcd-device", value);
-      } else if (key == "USBDeviceKeySerialNumber") {
-        record.setProperty("serial-number", value);
-      } else if (key == "USBDeviceKeyLinkSpeed") {
-        if (std::optional<std::string> speed = linkSpeedMegabits(value.text())) {
+      if (key == "USBDeviceKeyLinkSpeed") {
+        if (std::optional<std::string> speed = linkSpeedMegabits(prop->value().text()))
           record.setProperty("device-speed", TagValue(*speed));
-        }
-      } else if (key == "USBDeviceKeyVendorName") {
-        record.setProperty("manuf", value);
+      } else if (const char* field = fieldFor(kHostDeviceFields, key)) {
+        record.setProperty(field, prop->value());
       }
     }
-    ++devices_;
   }
 
  private:
   void addPeripheral(const Tag& device) {
-    Tag& record = top_.addChild("Peripherals")
-                      .addChild("USB")
-                      .addChild(formatText("Device:%d", devices_ + 1));
-    if (const TagValue* name = rawValue(device, "_name")) record.setValue(*name);
+    Tag& record = addDeviceRecord(device);
     for (const auto& prop : device.properties()) {
       std::string_view key = descriptorKey(prop->name());
-      const TagValue& value = prop->value();
-      if (key == "product_id") {
-        record.setProperty("product-id", value);
-      } else if (key == "vendor_id") {
-        record.setProperty("vendor-id", value);
-      } else if (key == "bcd_device") {
-        record.setProperty("bcd-device", value);
-      } else if (key == "serial_num") {
-        record.setProperty("serial-number", value);
-      } else if (key == "device_speed") {
+      if (key == "device_speed") {
         // Megabits per second; speeds without a known rate are left out.
-        const std::string& speed = value.text();
-        if (speed == "full_speed") {
-          record.setProperty("device-speed", TagValue("12"));
-        } else if (speed == "low_speed") {
-          record.setProperty("device-speed", TagValue("1.5"));
-        } else if (speed == "high_speed") {
-          record.setProperty("device-speed", TagValue("480"));
-        }
-      } else if (key == "manufacturer") {
-        record.setProperty("manuf", value);
-      } else if (key == "bus_power") {
-        record.setProperty("bus-power", value);
-      } else if (key == "bus_power_used") {
-        record.setProperty("bus-power-used", value);
+        if (const char* rate = fieldFor(kSpeedMegabits, prop->value().text()))
+          record.setProperty("device-speed", TagValue(rate));
+      } else if (const char* field = fieldFor(kDeviceFields, key)) {
+        record.setProperty(field, prop->value());
       }
     }
+  }
+
+  Tag& addDeviceRecord(const Tag& device) {
     ++devices_;
+    Tag& record =
+        top_.addChild("Peripherals").addChild("USB").addChild(formatText("Device:%d", devices_));
+    if (const TagValue* name = rawValue(device, "_name")) record.setValue(*name);
+    return record;
   }
 
   // `medium` holds the size, the disk's name and the volumes: the device
