@@ -10,7 +10,8 @@ cd "$(dirname "$0")/.."
 passed=0
 failed=0
 # Any stage adds what it counted: report PASSED FAILED. A stage that is one
-# check (formatting, a fuzz target, a build that breaks) counts as one.
+# check (formatting, a fuzz target, a build that breaks, a platform's
+# cross-build) counts as one: `if stage; then report 1 0; else report 0 1; fi`.
 report() {
   passed=$((passed + $1))
   failed=$((failed + $2))
