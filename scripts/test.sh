@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # The whole test suite: a release build and an AddressSanitizer +
 # UndefinedBehaviorSanitizer build, both with warnings as errors, then the
-# fuzz targets for a bounded time.
+# fuzz targets for a bounded time, then the macOS cross-build.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 bash scripts/setup.sh
@@ -39,4 +39,20 @@ for target in build-fuzz/*_fuzz; do
   "$target" -max_total_time="$seconds" -rss_limit_mb=2048 -print_final_stats=0 "$work" 2>&1 | tail -n 3
   rm -rf "$work"
 done
+
+# The macOS cross-build, after the Linux builds: it compiles and links the
+# *_darwin.cc files no Linux build sees. A stage of its own, with its own
+# verdict line.
+macos_stage() {
+  echo "== macOS cross-build (x86_64 and arm64)"
+  local start=$SECONDS
+  if bash scripts/build-macos.sh; then
+    echo "macOS stage: passed in $((SECONDS - start)) s"
+  else
+    echo "macOS stage: FAILED after $((SECONDS - start)) s"
+    return 1
+  fi
+}
+macos_stage || exit 1
+
 echo "all builds and tests passed"
