@@ -13,11 +13,11 @@
 #include <malloc.h>
 #endif
 
-#include "collect/command_runner.h"
-#include "collect/file_system.h"
+#include "../tests/fake_scan_sources.h"
 #include "collect/plist.h"
 #include "collect/plist_converter.h"
 #include "main/post_processor.h"
+#include "main/scan_pipeline.h"
 #include "zxml/QAXfile.h"
 #include "zxml/tag.h"
 
@@ -88,20 +88,11 @@ std::string makeDocument(int applications) {
   return doc;
 }
 
-// The builders that gather for themselves get a quiet machine.
-class QuietRunner : public CommandRunner {
- public:
-  std::string run(const std::string& command, size_t) override {
-    return command.rfind("ls ", 0) == 0 ? "jane\n" : std::string();
-  }
-};
-
-class NoFiles : public FileSystem {
- public:
-  std::vector<std::string> listDirectory(const std::string&) override { return {}; }
-  bool isDirectory(const std::string&) override { return false; }
-  bool readFile(const std::string&, size_t, std::string*) override { return false; }
-};
+FakeScanSources quietMachine() {
+  FakeScanSources fakes;
+  fakes.runner.answer("ls -1 /Users/", "jane\n");
+  return fakes;
+}
 
 void setCounters(benchmark::State& state, size_t bytes) {
   state.SetItemsProcessed(state.iterations() * state.range(0));
@@ -147,15 +138,15 @@ struct ConvertedDocument {
   std::string doc;
   PlistValue plist;
   TagTree raw{true, "Macintosh"};
-  QuietRunner runner;
-  NoFiles files;
+  // The builders that gather for themselves get a quiet machine.
+  FakeScanSources fakes = quietMachine();
 };
 
 void BM_PostProcess(benchmark::State& state) {
   ConvertedDocument in(static_cast<int>(state.range(0)));
   for (auto _ : state) {
     TagTree snapshot(true, "Snapshot");
-    postProcess(snapshot, in.raw, false, in.runner, in.files, nullptr);
+    postProcess(snapshot, in.raw, false, in.fakes.runner, in.fakes.files, nullptr);
     benchmark::DoNotOptimize(snapshot);
   }
   setCounters(state, in.doc.size());
@@ -164,7 +155,7 @@ void BM_PostProcess(benchmark::State& state) {
 void BM_SerialiseAndSave(benchmark::State& state) {
   ConvertedDocument in(static_cast<int>(state.range(0)));
   TagTree snapshot(true, "Snapshot");
-  postProcess(snapshot, in.raw, false, in.runner, in.files, nullptr);
+  postProcess(snapshot, in.raw, false, in.fakes.runner, in.fakes.files, nullptr);
   std::string path = "/tmp/cvn-scan-bench-" + std::to_string(getpid()) + ".qax";
   for (auto _ : state) {
     SnapshotFile file(true);
@@ -173,6 +164,17 @@ void BM_SerialiseAndSave(benchmark::State& state) {
   }
   std::remove(path.c_str());
   setCounters(state, in.doc.size());
+}
+
+// Everything after collection in one call, as the agent runs it.
+void BM_ScanPipeline(benchmark::State& state) {
+  std::string doc = makeDocument(static_cast<int>(state.range(0)));
+  FakeScanSources fakes = quietMachine();
+  for (auto _ : state) {
+    ScanResult result = runScanPipeline(doc, {}, ScanRequest(), fakes.sources());
+    benchmark::DoNotOptimize(result.image);
+  }
+  setCounters(state, doc.size());
 }
 
 BENCHMARK(BM_Parse)->Arg(2500)->Arg(5000)->Arg(10000)->Arg(20000)->Arg(40000)->Unit(
@@ -191,6 +193,7 @@ BENCHMARK(BM_PostProcess)
     ->Arg(20000)
     ->Arg(40000)
     ->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_ScanPipeline)->Arg(2500)->Arg(10000)->Arg(40000)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_SerialiseAndSave)
     ->Arg(2500)
     ->Arg(5000)

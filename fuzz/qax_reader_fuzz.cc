@@ -7,6 +7,7 @@
 #include <string_view>
 #include <vector>
 
+#include "qax_json.h"
 #include "qax_reader.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {

@@ -52,7 +52,12 @@ TEST(AssetInfoTest, WritesIdentityAndControlSummary) {
   facts.physical_memory = "4096";
   facts.video_memory = "256";
   facts.main_display_resolution = "1280 x 800";
-  facts.main_display_size = "13";
+  // A 29 x 18 cm panel: 13 inches across.
+  facts.main_display_edid =
+      "0x00ffffffffffff000610b69c000000000c130103801d12780aee91a3544c99260f505421080081000101010101"
+      "010101010101010101bc1b00a050201730302036001eb31000001800000010000000000000000000000000000000"
+      "0"
+      "000fc00436f6c6f72204c43440a202020000000fa007140010101010101010101010a008a";
   facts.disk_capacity = "465.8";
   AssetIdentity id;
   id.workgroup = "WORKGROUP";

@@ -17,11 +17,6 @@ constexpr size_t kBlockTrailerLength = 6;
 // Real snapshots inflate to a few megabytes; anything far beyond is a bomb.
 constexpr size_t kMaxInflated = size_t{256} << 20;
 constexpr uint64_t kMaxFileSize = uint64_t{1} << 31;
-// Real trees are a dozen levels deep; the limit keeps the recursive
-// renderers and destructors safe.
-constexpr size_t kMaxDepth = 256;
-constexpr char kZxmlHeader[] = "\xEF\xBB\xBF?zxml\n";
-constexpr size_t kZxmlHeaderLength = sizeof kZxmlHeader - 1;
 
 std::string numberText(uint64_t n) { return std::to_string(n); }
 
@@ -113,17 +108,14 @@ struct Section {
 };
 
 bool parseIni(std::string_view text, std::vector<Section>* sections, std::string* error) {
-  size_t line_number = 0;
-  size_t pos = 0;
-  while (pos < text.size()) {
-    ++line_number;
-    size_t end = text.find('\n', pos);
-    if (end == std::string_view::npos) {
+  TextLines lines(text, 0, 0);
+  std::string_view line;
+  for (TextLines::Step step; (step = lines.next(&line)) != TextLines::Step::kEnd;) {
+    const size_t line_number = lines.number();
+    if (step == TextLines::Step::kUnterminated) {
       *error = "directory line " + numberText(line_number) + ": no line feed at the end";
       return false;
     }
-    std::string_view line = text.substr(pos, end - pos);
-    pos = end + 1;
     if (line.size() >= 2 && line.front() == '[' && line.back() == ']') {
       sections->push_back(Section{std::string(line.substr(1, line.size() - 2)), line_number, {}});
       continue;
@@ -228,122 +220,6 @@ bool parseDirectory(QaxFile* file, std::string* error) {
   return true;
 }
 
-// -------------------------------------------------------------------- ZXML
-
-struct ParseState {
-  QaxTree* tree;
-  std::vector<QaxNode*> open;
-  QaxNode* current = nullptr;         // receives property lines
-  QaxProperty* property = nullptr;    // receives annotation lines after it
-  std::string* last_value = nullptr;  // receives continuation lines
-};
-
-std::string lineError(size_t line, const std::string& what) {
-  return "line " + numberText(line) + ": " + what;
-}
-
-bool parseZxml(std::string_view text, QaxTree* out, std::vector<std::string>* warnings,
-               std::string* error, size_t allowed_open) {
-  out->nodes.clear();
-  if (text.substr(0, kZxmlHeaderLength) != std::string_view(kZxmlHeader, kZxmlHeaderLength)) {
-    *error = lineError(1, "no \"?zxml\" header line with the byte-order mark");
-    return false;
-  }
-  ParseState st;
-  st.tree = out;
-  size_t pos = kZxmlHeaderLength;
-  size_t line_number = 1;
-  while (pos < text.size()) {
-    ++line_number;
-    size_t end = text.find('\n', pos);
-    if (end == std::string_view::npos) {
-      *error = lineError(line_number, "no line feed at the end of the text");
-      return false;
-    }
-    std::string_view line = text.substr(pos, end - pos);
-    pos = end + 1;
-    if (line.find('\0') != std::string_view::npos) {
-      *error = lineError(line_number, "NUL byte");
-      return false;
-    }
-    if (line == "-") {
-      if (st.open.empty()) {
-        *error = lineError(line_number, "\"-\" closes no open tag");
-        return false;
-      }
-      st.open.pop_back();
-      st.current = nullptr;
-      st.property = nullptr;
-      st.last_value = nullptr;
-      continue;
-    }
-    size_t eq = line.find('=');
-    if (eq == std::string_view::npos) {
-      if (!st.last_value) {
-        *error = lineError(line_number, "neither a tag, a property nor an annotation");
-        return false;
-      }
-      st.last_value->push_back('\n');
-      st.last_value->append(line);
-      if (warnings)
-        warnings->push_back(lineError(line_number,
-                                      "no \"=\"; taken as the continuation of the "
-                                      "value above"));
-      continue;
-    }
-    char first = line.front();
-    if (first == '+' || first == '*') {
-      std::vector<QaxNode>& siblings = st.open.empty() ? out->nodes : st.open.back()->children;
-      siblings.emplace_back();
-      QaxNode& node = siblings.back();
-      node.name = std::string(line.substr(1, eq - 1));
-      node.value = std::string(line.substr(eq + 1));
-      node.branch = first == '+';
-      if (node.branch) {
-        if (st.open.size() >= kMaxDepth) {
-          *error = lineError(line_number, "tags nested deeper than " + numberText(kMaxDepth));
-          return false;
-        }
-        st.open.push_back(&node);
-      }
-      st.current = &node;
-      st.property = nullptr;
-      st.last_value = &node.value;
-    } else if (first == '~') {
-      std::vector<QaxAnnotation>* list = st.property  ? &st.property->annotations
-                                         : st.current ? &st.current->annotations
-                                                      : nullptr;
-      if (!list) {
-        *error = lineError(line_number, "annotation without a tag or property above it");
-        return false;
-      }
-      list->push_back(
-          QaxAnnotation{std::string(line.substr(1, eq - 1)), std::string(line.substr(eq + 1))});
-      st.last_value = &list->back().text;
-    } else {
-      if (!st.current) {
-        *error = lineError(line_number, "property outside a tag (after a closing \"-\")");
-        return false;
-      }
-      st.current->properties.push_back(
-          QaxProperty{std::string(line.substr(0, eq)), std::string(line.substr(eq + 1)), {}});
-      st.property = &st.current->properties.back();
-      st.last_value = &st.property->value;
-    }
-  }
-  if (out->nodes.empty()) {
-    *error = lineError(line_number, "no top tag");
-    return false;
-  }
-  if (st.open.size() > allowed_open) {
-    *error = lineError(line_number, numberText(st.open.size()) + " tags still open at the end");
-    return false;
-  }
-  return true;
-}
-
-// ------------------------------------------------------------------ blocks
-
 std::string blockWhere(const QaxBlock& b) {
   return "block " + numberText(b.index) + " (" + b.type + ", offset " + numberText(b.offset) + ")";
 }
@@ -396,7 +272,8 @@ bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::
     b->text = payload.substr(0, position);
     b->sections = payload.substr(position);
     allowed_open = 1;  // the top tag's close is not part of any section
-  } else if (n >= kZxmlHeaderLength && std::memcmp(p, kZxmlHeader, kZxmlHeaderLength) == 0) {
+  } else if (n >= kZxmlHeader.size() &&
+             std::memcmp(p, kZxmlHeader.data(), kZxmlHeader.size()) == 0) {
     // Plain text padded with zeros.
     const void* nul = std::memchr(p, 0, n);
     size_t text_length = nul ? static_cast<size_t>(static_cast<const uint8_t*>(nul) - p) : n;
@@ -411,7 +288,7 @@ bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::
     *error = blockWhere(*b) + ": no \"ZXML\" block trailer";
     return false;
   }
-  if (!parseZxml(b->text, &b->tree, &warnings, &detail, allowed_open)) {
+  if (!parseZxmlText(b->text, &b->tree, &warnings, &detail, allowed_open)) {
     *error = blockWhere(*b) + " " + detail;
     return false;
   }
@@ -419,168 +296,12 @@ bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::
   return true;
 }
 
-// ---------------------------------------------------------------- renderers
-
-void renderAnnotations(const std::vector<QaxAnnotation>& list, std::string& out) {
-  for (const QaxAnnotation& a : list) out += "~" + a.key + "=" + a.text + "\n";
-}
-
-void renderNode(const QaxNode& node, std::string& out) {
-  out += (node.branch ? "+" : "*") + node.name + "=" + node.value + "\n";
-  renderAnnotations(node.annotations, out);
-  for (const QaxProperty& p : node.properties) {
-    out += p.name + "=" + p.value + "\n";
-    renderAnnotations(p.annotations, out);
-  }
-  if (!node.branch) return;
-  for (const QaxNode& c : node.children) renderNode(c, out);
-  out += "-\n";
-}
-
-// Valid UTF-8 passes through; any other byte is written as the Latin-1
-// character of that code so the output is always valid JSON.
-void appendJsonString(std::string_view s, std::string& out) {
-  static const char kHex[] = "0123456789abcdef";
-  out += '"';
-  size_t i = 0;
-  while (i < s.size()) {
-    unsigned char c = static_cast<unsigned char>(s[i]);
-    if (c == '"' || c == '\\') {
-      out += '\\';
-      out += static_cast<char>(c);
-      ++i;
-      continue;
-    }
-    if (c < 0x20) {
-      if (c == '\n') {
-        out += "\\n";
-      } else if (c == '\t') {
-        out += "\\t";
-      } else if (c == '\r') {
-        out += "\\r";
-      } else {
-        out += "\\u00";
-        out += kHex[c >> 4];
-        out += kHex[c & 15];
-      }
-      ++i;
-      continue;
-    }
-    if (c < 0x80) {
-      out += static_cast<char>(c);
-      ++i;
-      continue;
-    }
-    size_t len = c >= 0xF0 && c <= 0xF4 ? 4 : c >= 0xE0 ? 3 : c >= 0xC2 && c < 0xE0 ? 2 : 0;
-    bool valid = len > 0 && i + len <= s.size();
-    for (size_t k = 1; valid && k < len; ++k)
-      valid = (static_cast<unsigned char>(s[i + k]) & 0xC0) == 0x80;
-    if (valid && len == 3) {
-      unsigned char c1 = static_cast<unsigned char>(s[i + 1]);
-      valid = !(c == 0xE0 && c1 < 0xA0) && !(c == 0xED && c1 >= 0xA0);
-    } else if (valid && len == 4) {
-      unsigned char c1 = static_cast<unsigned char>(s[i + 1]);
-      valid = !(c == 0xF0 && c1 < 0x90) && !(c == 0xF4 && c1 >= 0x90);
-    }
-    if (valid) {
-      out.append(s.substr(i, len));
-      i += len;
-    } else {
-      out += "\\u00";
-      out += kHex[c >> 4];
-      out += kHex[c & 15];
-      ++i;
-    }
-  }
-  out += '"';
-}
-
-void appendJsonAnnotations(const std::vector<QaxAnnotation>& list, std::string& out) {
-  out += '[';
-  for (size_t i = 0; i < list.size(); ++i) {
-    if (i) out += ", ";
-    out += "{\"key\": ";
-    appendJsonString(list[i].key, out);
-    out += ", \"text\": ";
-    appendJsonString(list[i].text, out);
-    out += '}';
-  }
-  out += ']';
-}
-
-void appendJsonNode(const QaxNode& node, size_t depth, std::string& out) {
-  std::string pad(2 * depth + 2, ' ');
-  out += "{\n" + pad + "\"name\": ";
-  appendJsonString(node.name, out);
-  out += ",\n" + pad + "\"kind\": \"" + (node.branch ? "branch" : "leaf") + "\",\n" + pad +
-         "\"value\": ";
-  appendJsonString(node.value, out);
-  out += ",\n" + pad + "\"annotations\": ";
-  appendJsonAnnotations(node.annotations, out);
-  out += ",\n" + pad + "\"properties\": [";
-  for (size_t i = 0; i < node.properties.size(); ++i) {
-    const QaxProperty& p = node.properties[i];
-    out += i ? ",\n" : "\n";
-    out += pad + "  {\"name\": ";
-    appendJsonString(p.name, out);
-    out += ", \"value\": ";
-    appendJsonString(p.value, out);
-    out += ", \"annotations\": ";
-    appendJsonAnnotations(p.annotations, out);
-    out += '}';
-  }
-  if (!node.properties.empty()) out += "\n" + pad;
-  out += "],\n" + pad + "\"children\": [";
-  for (size_t i = 0; i < node.children.size(); ++i) {
-    out += i ? ", " : "";
-    appendJsonNode(node.children[i], depth + 1, out);
-  }
-  out += "]\n" + std::string(2 * depth, ' ') + "}";
-}
-
-const QaxNode* findIn(const std::vector<QaxNode>& list, std::string_view name) {
-  for (const QaxNode& n : list)
-    if (n.name == name) return &n;
-  return nullptr;
-}
-
 }  // namespace
-
-const QaxNode* QaxNode::findChild(std::string_view child_name) const {
-  return findIn(children, child_name);
-}
-
-const QaxProperty* QaxNode::findProperty(std::string_view property_name) const {
-  for (const QaxProperty& p : properties)
-    if (p.name == property_name) return &p;
-  return nullptr;
-}
-
-const QaxNode* QaxTree::findNode(std::string_view path) const {
-  const QaxNode* node = top();
-  if (!path.empty() && path.front() == '/') path.remove_prefix(1);
-  while (node && !path.empty()) {
-    size_t slash = path.find('/');
-    node = node->findChild(path.substr(0, slash));
-    path.remove_prefix(slash == std::string_view::npos ? path.size() : slash + 1);
-  }
-  return node;
-}
-
-const QaxProperty* QaxTree::findProperty(std::string_view path, std::string_view name) const {
-  const QaxNode* node = findNode(path);
-  return node ? node->findProperty(name) : nullptr;
-}
 
 const QaxBlock* QaxFile::findBlock(std::string_view type) const {
   for (const QaxBlock& b : blocks)
     if (b.type == type) return &b;
   return nullptr;
-}
-
-bool parseZxmlText(std::string_view text, QaxTree* out, std::vector<std::string>* warnings,
-                   std::string* error) {
-  return parseZxml(text, out, warnings, error, 0);
 }
 
 bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* error) {
@@ -673,51 +394,6 @@ bool readQaxFile(const std::string& path, QaxFile* out, std::string* error) {
     return false;
   }
   return parseQaxImage(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size(), out, error);
-}
-
-std::string renderZxmlText(const QaxTree& tree) {
-  std::string out(kZxmlHeader);
-  for (const QaxNode& n : tree.nodes) renderNode(n, out);
-  return out;
-}
-
-std::string renderQaxJson(const QaxFile& file) {
-  std::string out =
-      "{\n  \"size\": " + numberText(file.size) +
-      ",\n  \"directory_offset\": " + numberText(file.directory_offset) +
-      ",\n  \"byte_order\": \"" + (file.little_endian ? "little-endian" : "big-endian") +
-      "\",\n  \"directory_compressed\": " + (file.directory_compressed ? "true" : "false") +
-      ",\n  \"count\": " + numberText(file.count) +
-      ",\n  \"snapshotcount\": " + numberText(file.snapshot_count) + ",\n  \"blocks\": [";
-  for (size_t i = 0; i < file.blocks.size(); ++i) {
-    const QaxBlock& b = file.blocks[i];
-    out += i ? ",\n    {" : "\n    {";
-    out += "\"index\": " + numberText(b.index) + ", \"type\": ";
-    appendJsonString(b.type, out);
-    out += ", \"offset\": " + numberText(b.offset) + ", \"length\": " + numberText(b.length);
-    if (b.type == "snapshot") {
-      out += ", \"timestamp\": ";
-      appendJsonString(b.timestamp, out);
-      out += ", \"snaptype\": ";
-      appendJsonString(b.snaptype, out);
-    }
-    if (!b.id.empty()) {
-      out += ", \"ID\": ";
-      appendJsonString(b.id, out);
-    }
-    if (b.kind == QaxBlock::Kind::kRawData) {
-      out += ", \"inflated_size\": " + numberText(b.data.size()) + "}";
-      continue;
-    }
-    out += ",\n     \"trees\": [";
-    for (size_t t = 0; t < b.tree.nodes.size(); ++t) {
-      out += t ? ", " : "";
-      appendJsonNode(b.tree.nodes[t], 3, out);
-    }
-    out += "]}";
-  }
-  out += file.blocks.empty() ? "]\n}\n" : "\n  ]\n}\n";
-  return out;
 }
 
 }  // namespace cvn

@@ -10,43 +10,9 @@
 #include <string_view>
 #include <vector>
 
+#include "zxml_text.h"
+
 namespace cvn {
-
-struct QaxAnnotation {
-  std::string key;
-  std::string text;
-};
-
-struct QaxProperty {
-  std::string name;
-  std::string value;
-  std::vector<QaxAnnotation> annotations;
-};
-
-/// A tag as the text stored it: values are texts, whatever their kind was.
-struct QaxNode {
-  std::string name;
-  bool branch = false;
-  std::string value;
-  std::vector<QaxAnnotation> annotations;
-  std::vector<QaxProperty> properties;
-  std::vector<QaxNode> children;
-
-  const QaxNode* findChild(std::string_view child_name) const;
-  const QaxProperty* findProperty(std::string_view property_name) const;
-};
-
-struct QaxTree {
-  /// The tags directly under the document; the first is the top tag.
-  std::vector<QaxNode> nodes;
-
-  const QaxNode* top() const { return nodes.empty() ? nullptr : &nodes.front(); }
-  /// The tag at a "/"-separated path below the top tag ("/Hardware/CPU" or
-  /// "Hardware/CPU"); "" and "/" give the top tag. Null when missing.
-  const QaxNode* findNode(std::string_view path) const;
-  /// The property `name` of the tag at `path`, or null.
-  const QaxProperty* findProperty(std::string_view path, std::string_view name) const;
-};
 
 struct QaxBlock {
   enum class Kind { kTree, kRawData };
@@ -93,19 +59,9 @@ struct QaxFile {
 bool readQaxFile(const std::string& path, QaxFile* out, std::string* error);
 /// The same for a file image in memory.
 bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* error);
-/// Parses ZXML text (header line included). Continuation lines are reported
-/// in `warnings` (may be null).
-bool parseZxmlText(std::string_view text, QaxTree* out, std::vector<std::string>* warnings,
-                   std::string* error);
-
 /// Inflates one complete zlib stream that must fill `size` exactly; the
 /// result is bounded to 256 MiB.
 bool inflateQaxStream(const uint8_t* data, size_t size, std::string* out, std::string* error);
-
-/// The tree as ZXML text, header line included.
-std::string renderZxmlText(const QaxTree& tree);
-/// The directory and the trees as JSON.
-std::string renderQaxJson(const QaxFile& file);
 
 }  // namespace cvn
 

@@ -6,6 +6,7 @@
 #include <cstring>
 #include <string>
 
+#include "qax_json.h"
 #include "qax_reader.h"
 
 namespace {

@@ -2,8 +2,10 @@
 
 #include <cctype>
 #include <cstdio>
+#include <utility>
 
 #include "collect/quick_facts.h"
+#include "sections/edid.h"
 #include "zxml/QAXfile.h"
 
 namespace cvn {
@@ -40,6 +42,23 @@ void writeAssetFields(TagTree& tree, const AssetIdentity& identity, const std::s
   // A fixed placeholder: the console fills in real asset tags.
   tree.setValue("/asset-tag", TagValue("1234567890000"));
 }
+
+// The summary's quick facts, in the order the summary lists them.
+using FactField = std::pair<const char*, std::string QuickFacts::*>;
+const FactField kSummaryBeforeChassis[] = {
+    {"/control/cpu-count", &QuickFacts::package_count},
+    {"/control/cpu-count-virtual", &QuickFacts::processor_count},
+    {"/control/cpu-speed", &QuickFacts::processor_speed},
+    {"/control/cpu-model", &QuickFacts::processor_model},
+    {"/control/cpu-manuf", &QuickFacts::processor_maker},
+    {"/control/system-model", &QuickFacts::machine_model},
+    {"/control/system-manuf", &QuickFacts::system_maker},
+};
+const FactField kSummaryAfterChassis[] = {
+    {"/control/phys-memory", &QuickFacts::physical_memory},
+    {"/control/video-ram", &QuickFacts::video_memory},
+    {"/control/video-res", &QuickFacts::main_display_resolution},
+};
 
 void copyOsField(TagTree& tree, const Tag* os_entry, const char* field, const char* path) {
   if (!os_entry) return;
@@ -101,23 +120,15 @@ std::unique_ptr<TagTree> buildAssetInfo(uint8_t tree_flag, const TagTree& snapsh
   copyOsField(t, os_entry, "version", "/control/os-ver");
   t.setValue("/control/os-manuf", TagValue("Apple Inc."));
   copyOsField(t, os_entry, "architecture", "/control/os-arch");
-  t.setValue("/control/cpu-count", TagValue(facts.package_count));
-  t.setValue("/control/cpu-count-virtual", TagValue(facts.processor_count));
-  t.setValue("/control/cpu-speed", TagValue(facts.processor_speed));
-  t.setValue("/control/cpu-model", TagValue(facts.processor_model));
-  t.setValue("/control/cpu-manuf", TagValue(facts.processor_maker));
-  t.setValue("/control/system-model", TagValue(facts.machine_model));
-  t.setValue("/control/system-manuf", TagValue(facts.system_maker));
+  for (const auto& [path, fact] : kSummaryBeforeChassis) t.setValue(path, TagValue(facts.*fact));
   t.setValue("/control/chassis-manuf", TagValue("Apple Inc."));
   t.setValue("/control/mb-manuf", TagValue("Apple Inc."));
-  t.setValue("/control/phys-memory", TagValue(facts.physical_memory));
-  t.setValue("/control/video-ram", TagValue(facts.video_memory));
-  t.setValue("/control/video-res", TagValue(facts.main_display_resolution));
+  for (const auto& [path, fact] : kSummaryAfterChassis) t.setValue(path, TagValue(facts.*fact));
   const Tag* video = snapshot.top().findChild("Video");
   const Tag* monitors = video ? video->findChild("Monitors") : nullptr;
   t.setValue("/control/monitor-count",
              TagValue(std::to_string(monitors ? monitors->children().size() : 0)));
-  t.setValue("/control/monitor-diag", TagValue(facts.main_display_size));
+  t.setValue("/control/monitor-diag", TagValue(edidDiagonalText(facts.main_display_edid)));
   t.setValue("/control/hdd-capacity", TagValue(facts.disk_capacity));
   writeDiskEntries(t, snapshot);
   // Fixed: the console reads the firewall from the snapshot itself.
@@ -126,14 +137,14 @@ std::unique_ptr<TagTree> buildAssetInfo(uint8_t tree_flag, const TagTree& snapsh
 }
 
 void addDebugAssetInfo(SnapshotFile& file, uint8_t tree_flag, const std::string& host_name,
-                       const AssetIdentity& identity, const std::string& profiler_output) {
+                       const std::string& date, const AssetIdentity& identity,
+                       const std::string& profiler_output) {
   TagTree tree(tree_flag != 0, "AssetInfo");
-  std::string date = SnapshotFile::makeTimestamp(true);
   writeAssetFields(tree, identity, host_name, std::string(), "nvtPhysical", "nstNone", "sstNone",
                    date, std::string());
   tree.setValue("/scan-attempt", TagValue("1"));
   tree.setValue("/error-message", TagValue("Debug scan"));
-  file.addTree(tree, kAssetInfoBlock, false, true);
+  file.addTree(tree, kAssetInfoBlock, kWholeText, kCompressed);
   file.addRawData(reinterpret_cast<const uint8_t*>(profiler_output.data()), profiler_output.size());
 }
 

@@ -38,9 +38,10 @@ std::unique_ptr<TagTree> buildAssetInfo(uint8_t tree_flag, const TagTree& snapsh
                                         const AssetIdentity& identity);
 
 /// The debug scan's asset tree and, beside it, the profiler's whole output as
-/// a raw-data block; both are added to `file`.
+/// a raw-data block; both are added to `file`. `date` is the long date text.
 void addDebugAssetInfo(SnapshotFile& file, uint8_t tree_flag, const std::string& host_name,
-                       const AssetIdentity& identity, const std::string& profiler_output);
+                       const std::string& date, const AssetIdentity& identity,
+                       const std::string& profiler_output);
 
 }  // namespace cvn
 

@@ -6,21 +6,6 @@ namespace cvn {
 
 namespace {
 
-const std::string* findString(const PlistValue& dictionary, std::string_view key) {
-  const PlistValue* value = dictionary.find(key);
-  return value && value->isString() ? &value->text : nullptr;
-}
-
-const PlistValue* findDictionary(const PlistValue& dictionary, std::string_view key) {
-  const PlistValue* value = dictionary.find(key);
-  return value && value->isDictionary() ? value : nullptr;
-}
-
-const PlistValue* findArray(const PlistValue& dictionary, std::string_view key) {
-  const PlistValue* value = dictionary.find(key);
-  return value && value->isArray() ? value : nullptr;
-}
-
 std::string firstAddress(const PlistValue& addresses) {
   if (addresses.array.empty() || !addresses.array.front().isString()) return std::string();
   return addresses.array.front().text;
@@ -28,13 +13,13 @@ std::string firstAddress(const PlistValue& addresses) {
 
 // Manual flag and hardware address of the chosen interface.
 void readInterface(const PlistValue& item, bool* manual, std::string* hardware_address) {
-  if (const PlistValue* ipv4 = findDictionary(item, "IPv4")) {
-    const std::string* method = findString(*ipv4, "ConfigMethod");
+  if (const PlistValue* ipv4 = item.findDictionary("IPv4")) {
+    const std::string* method = ipv4->findText("ConfigMethod");
     *manual = method && *method == "Manual";
   }
   hardware_address->clear();
-  if (const PlistValue* ethernet = findDictionary(item, "Ethernet")) {
-    if (const std::string* mac = findString(*ethernet, "MAC Address")) *hardware_address = *mac;
+  if (const PlistValue* ethernet = item.findDictionary("Ethernet")) {
+    if (const std::string* mac = ethernet->findText("MAC Address")) *hardware_address = *mac;
   }
 }
 
@@ -62,9 +47,9 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
   if (interfaces) {
     for (const PlistValue& item : interfaces->array) {
       if (!item.isDictionary()) continue;
-      const PlistValue* addresses = findArray(item, "ip_address");
+      const PlistValue* addresses = item.findArray("ip_address");
       if (ip.empty()) {
-        const std::string* name = findString(item, "interface");
+        const std::string* name = item.findText("interface");
         if (!name || name->compare(0, 2, "en") != 0 || !addresses) continue;
         ip = firstAddress(*addresses);
       } else {
@@ -83,9 +68,9 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
   if (locations) {
     for (const PlistValue& location : locations->array) {
       if (!location.isDictionary()) continue;
-      const std::string* active = findString(location, "spnetworklocation_isActive");
+      const std::string* active = location.findText("spnetworklocation_isActive");
       if (!active || *active != "yes") continue;
-      services = findArray(location, "spnetworklocation_services");
+      services = location.findArray("spnetworklocation_services");
       break;
     }
   }
@@ -94,16 +79,16 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
 
   for (const PlistValue& service : services->array) {
     if (!service.isDictionary()) continue;
-    const std::string* address = findString(service, "hardware_address");
+    const std::string* address = service.findText("hardware_address");
     if (!address || *address != hardware_address) continue;
     out->mac_address.clear();
     for (char c : hardware_address) out->mac_address += c == ':' ? '-' : upperAscii(c);
-    const PlistValue* smb = findDictionary(service, "SMB");
-    const std::string* workgroup = smb ? findString(*smb, "Workgroup") : nullptr;
+    const PlistValue* smb = service.findDictionary("SMB");
+    const std::string* workgroup = smb ? smb->findText("Workgroup") : nullptr;
     if (!workgroup) continue;
     for (char c : *workgroup) out->workgroup += upperAscii(c);
     out->workgroup_length = utf16Length(out->workgroup);
-    const std::string* netbios = findString(*smb, "NetBIOSName");
+    const std::string* netbios = smb->findText("NetBIOSName");
     if (netbios) out->netbios_name = *netbios;
     break;
   }

@@ -33,6 +33,15 @@ struct PlistValue {
   bool isDictionary() const { return kind == Kind::kDictionary; }
   /// Dictionary lookup by exact key; null when absent or not a dictionary.
   const PlistValue* find(std::string_view key) const;
+  /// The same, null also when the value there is of another kind.
+  const std::string* findText(std::string_view key) const;
+  const PlistValue* findArray(std::string_view key) const;
+  const PlistValue* findDictionary(std::string_view key) const;
+  /// The string at `key`, or empty.
+  std::string textAt(std::string_view key) const;
+  /// The integer at `key` in decimal, or the string there as it is; empty
+  /// for anything else.
+  std::string numberTextAt(std::string_view key) const;
 };
 
 struct PlistEntry {
@@ -54,6 +63,8 @@ bool parsePlist(std::string_view document, PlistValue* out, std::string* warning
 /// "_items" array of the first dictionary whose "_dataType" is `data_type`.
 /// Null when there is none or the document has another shape.
 const PlistValue* findProfilerItems(const PlistValue& root, std::string_view data_type);
+/// The first of those items, or null.
+const PlistValue* findFirstProfilerItem(const PlistValue& root, std::string_view data_type);
 
 }  // namespace cvn
 

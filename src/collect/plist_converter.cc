@@ -158,10 +158,10 @@ void PlistConverter::convertPlist(const PlistValue& root) {
   if (!root.isArray()) return;
   for (const PlistValue& element : root.array) {
     if (!element.isDictionary()) continue;
-    const PlistValue* data_type = element.find("_dataType");
-    if (!data_type || !data_type->isString() || isSkippedDataType(data_type->text)) continue;
+    const std::string* data_type = element.findText("_dataType");
+    if (!data_type || isSkippedDataType(*data_type)) continue;
     std::deque<Node> chain;
-    chainFor("/" + data_type->text, chain);
+    chainFor("/" + *data_type, chain);
     Node& base = chain.back();
     for (const PlistEntry& entry : element.dictionary) {
       if (isSkippedTopKey(entry.key)) continue;

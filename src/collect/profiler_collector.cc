@@ -98,10 +98,11 @@ std::string ProfilerCollector::collect(bool progress, std::FILE* out,
 }
 
 bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
-                            PlistValue* out) {
-  std::string warning;
-  bool read = parsePlist(document, out, &warning);
-  if (warning.empty() || part_ends.size() < 2) return read;
+                            PlistValue* out, std::string* warning) {
+  std::string problem;
+  bool read = parsePlist(document, out, &problem);
+  if (warning) *warning = problem;
+  if (problem.empty() || part_ends.size() < 2) return read;
 
   PlistValue merged;
   merged.kind = PlistValue::Kind::kArray;

@@ -42,9 +42,10 @@ struct PlistValue;
 /// problem (one data type's output was malformed or broke off), each data
 /// type's piece is read on its own instead, so one bad piece costs only its
 /// own data type, not every one after it. Returns false when nothing could
-/// be read.
+/// be read. `warning`, when given, receives the whole document's first
+/// problem.
 bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
-                            PlistValue* out);
+                            PlistValue* out, std::string* warning = nullptr);
 
 }  // namespace cvn
 

@@ -5,26 +5,21 @@
 #include <cstdlib>
 
 #include "collect/command_runner.h"
-#include "sections/edid.h"
 #include "zxml/size_text.h"
 
 namespace cvn {
+
+namespace {
 
 const char kPlatformUuidCommand[] =
     "ioreg -rd1 -c IOPlatformExpertDevice | awk '/IOPlatformUUID/ { split($0, line, \"\\\"\"); "
     "printf(\"%s\", line[4]); }'";
 
-namespace {
-
-const PlistValue* firstItem(const PlistValue& root, std::string_view data_type) {
-  const PlistValue* items = findProfilerItems(root, data_type);
-  return items && !items->array.empty() ? &items->array.front() : nullptr;
-}
-
-std::string stringAt(const PlistValue* dict, std::string_view key) {
-  if (!dict) return std::string();
-  const PlistValue* v = dict->find(key);
-  return v && v->isString() ? v->text : std::string();
+// A missing data type reads as an item without keys.
+const PlistValue& firstItem(const PlistValue& root, std::string_view data_type) {
+  static const PlistValue kNoItem;
+  const PlistValue* item = findFirstProfilerItem(root, data_type);
+  return item ? *item : kNoItem;
 }
 
 std::string wholeNumber(double value) {
@@ -40,34 +35,25 @@ std::string oneDecimal(double value) {
   return buf;
 }
 
-std::string integerText(const PlistValue* dict, std::string_view key) {
-  if (!dict) return std::string();
-  const PlistValue* v = dict->find(key);
-  if (!v) return std::string();
-  if (v->kind == PlistValue::Kind::kInteger) return std::to_string(v->integer);
-  if (v->isString()) return v->text;
-  return std::string();
-}
-
 void readDisplays(const PlistValue& root, QuickFacts* facts) {
   const PlistValue* items = findProfilerItems(root, "SPDisplaysDataType");
   if (!items) return;
   bool have_vram = false;
   for (const PlistValue& adapter : items->array) {
     if (!have_vram) {
-      std::string vram = stringAt(&adapter, "spdisplays_vram");
-      if (vram.empty()) vram = stringAt(&adapter, "spdisplays_vram_shared");
+      std::string vram = adapter.textAt("spdisplays_vram");
+      if (vram.empty()) vram = adapter.textAt("spdisplays_vram_shared");
       if (!vram.empty()) {
         facts->video_memory = wholeNumber(SizeText::toKilobytes(vram) / 1024.0);
         have_vram = true;
       }
     }
-    const PlistValue* displays = adapter.find("spdisplays_ndrvs");
-    if (!displays || !displays->isArray()) continue;
+    const PlistValue* displays = adapter.findArray("spdisplays_ndrvs");
+    if (!displays) continue;
     for (const PlistValue& display : displays->array) {
-      if (stringAt(&display, "spdisplays_main") != "spdisplays_yes") continue;
-      facts->main_display_resolution = stringAt(&display, "spdisplays_resolution");
-      facts->main_display_size = edidDiagonalText(stringAt(&display, "_spdisplays_edid"));
+      if (display.textAt("spdisplays_main") != "spdisplays_yes") continue;
+      facts->main_display_resolution = display.textAt("spdisplays_resolution");
+      facts->main_display_edid = display.textAt("_spdisplays_edid");
       return;
     }
   }
@@ -79,18 +65,18 @@ void readDisks(const PlistValue& root, QuickFacts* facts) {
   double disks = 0, volumes = 0, free = 0;
   bool any_disk = false, any_volume = false;
   for (const PlistValue& controller : controllers->array) {
-    const PlistValue* devices = controller.find("_items");
-    if (!devices || !devices->isArray()) continue;
+    const PlistValue* devices = controller.findArray("_items");
+    if (!devices) continue;
     for (const PlistValue& device : devices->array) {
-      std::string size = stringAt(&device, "size");
+      std::string size = device.textAt("size");
       if (size.empty()) continue;
       disks += SizeText::toGigabytes(size);
       any_disk = true;
-      const PlistValue* vols = device.find("volumes");
-      if (!vols || !vols->isArray()) continue;
+      const PlistValue* vols = device.findArray("volumes");
+      if (!vols) continue;
       for (const PlistValue& volume : vols->array) {
-        volumes += SizeText::toGigabytes(stringAt(&volume, "size"));
-        free += SizeText::toGigabytes(stringAt(&volume, "free_space"));
+        volumes += SizeText::toGigabytes(volume.textAt("size"));
+        free += SizeText::toGigabytes(volume.textAt("free_space"));
         any_volume = true;
       }
     }
@@ -106,39 +92,37 @@ void readDisks(const PlistValue& root, QuickFacts* facts) {
 
 QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
   QuickFacts facts;
-  const PlistValue* software = firstItem(root, "SPSoftwareDataType");
-  facts.local_host_name = stringAt(software, "local_host_name");
-  std::string user = stringAt(software, "user_name");
+  const PlistValue& software = firstItem(root, "SPSoftwareDataType");
+  facts.local_host_name = software.textAt("local_host_name");
+  std::string user = software.textAt("user_name");
   size_t open = user.find('(');
   if (open != std::string::npos) {
     size_t close = user.find(')', open + 1);
     if (close != std::string::npos) facts.user_name = user.substr(open + 1, close - open - 1);
   }
-  facts.os_version = stringAt(software, "os_version");
+  facts.os_version = software.textAt("os_version");
 
-  const PlistValue* hardware = firstItem(root, "SPHardwareDataType");
+  const PlistValue& hardware = firstItem(root, "SPHardwareDataType");
   facts.platform_uuid = runner.run(kPlatformUuidCommand, 40);
-  if (facts.platform_uuid.empty()) facts.platform_uuid = stringAt(hardware, "platform_UUID");
-  if (hardware) {
-    const PlistValue* packages = hardware->find("packages");
-    if (packages && packages->kind == PlistValue::Kind::kInteger) {
-      facts.package_count = std::to_string(static_cast<unsigned>(packages->integer));
-    }
+  if (facts.platform_uuid.empty()) facts.platform_uuid = hardware.textAt("platform_UUID");
+  const PlistValue* packages = hardware.find("packages");
+  if (packages && packages->kind == PlistValue::Kind::kInteger) {
+    facts.package_count = std::to_string(static_cast<unsigned>(packages->integer));
   }
-  facts.processor_count = integerText(hardware, "number_processors");
-  std::string speed = stringAt(hardware, "current_processor_speed");
+  facts.processor_count = hardware.numberTextAt("number_processors");
+  std::string speed = hardware.textAt("current_processor_speed");
   if (!speed.empty()) {
     double number = std::atof(firstWord(speed).c_str());
     // Old profilers print "2.26 GHz", very old ones "867 MHz".
     facts.processor_speed =
         wholeNumber(speed.find("MHz") != std::string::npos ? number : number * 1000);
   }
-  facts.processor_model = stringAt(hardware, "cpu_type");
+  facts.processor_model = hardware.textAt("cpu_type");
   if (facts.processor_model.find("Intel") != std::string::npos)
     facts.processor_maker = "GenuineIntel";
-  facts.machine_model = stringAt(hardware, "machine_model");
+  facts.machine_model = hardware.textAt("machine_model");
   facts.system_maker = "Apple Inc.";
-  std::string memory = stringAt(hardware, "physical_memory");
+  std::string memory = hardware.textAt("physical_memory");
   if (!memory.empty()) facts.physical_memory = wholeNumber(SizeText::toKilobytes(memory) / 1024.0);
 
   readDisplays(root, &facts);
@@ -147,7 +131,7 @@ QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
 }
 
 std::string readSerialNumber(const PlistValue& root) {
-  return stringAt(firstItem(root, "SPHardwareDataType"), "serial_number");
+  return firstItem(root, "SPHardwareDataType").textAt("serial_number");
 }
 
 }  // namespace cvn

@@ -34,8 +34,9 @@ struct QuickFacts {
   /// Megabytes, a whole number.
   std::string video_memory;
   std::string main_display_resolution;
-  /// The main display's diagonal in inches, from its EDID.
-  std::string main_display_size;
+  /// The main display's EDID as the profiler prints it (hexadecimal); the
+  /// asset summary decodes its diagonal.
+  std::string main_display_edid;
   /// Gigabytes with one decimal: the serial-ATA disks' total size, their
   /// volumes' total size and the volumes' total free space.
   std::string disk_capacity;
@@ -48,9 +49,6 @@ QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner);
 
 /// The first hardware item's "serial_number"; empty when missing.
 std::string readSerialNumber(const PlistValue& root);
-
-/// The command whose output is the platform UUID.
-extern const char kPlatformUuidCommand[];
 
 }  // namespace cvn
 

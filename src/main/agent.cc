@@ -1,3 +1,5 @@
+#include "main/agent.h"
+
 #include <cstdio>
 #include <string>
 #include <vector>
@@ -7,6 +9,7 @@
 #include "collect/file_system.h"
 #include "collect/process_table.h"
 #include "main/command_line.h"
+#include "main/result_directory.h"
 #include "main/scan_driver.h"
 
 namespace cvn {
@@ -38,9 +41,17 @@ int runAgent(int argc, char** argv) {
   output.progress_log = settings.log ? 1 : 0;
 
   std::unique_ptr<ProcessTable> processes = makeSystemProcessTable();
-  ScanDriver driver(ScanTools{systemCommandRunner(), *processes, systemFileSystem(),
-                              readComputerName, stdout, stderr});
-  driver.run(output, settings.silent, settings.debug, settings.ip, settings.login);
+  SystemClock clock;
+  WorkingDirectory directory;
+  ScanSources sources{systemCommandRunner(), *processes, systemFileSystem(), clock,
+                      readComputerName};
+  ScanDriver driver(ScanTools{sources, directory, stdout, stderr});
+  ScanOptions options;
+  options.silent = settings.silent;
+  options.debug = settings.debug;
+  options.ip = settings.ip;
+  options.login = settings.login;
+  driver.run(output, options);
   std::fflush(stdout);
   return 0;
 }

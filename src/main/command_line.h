@@ -28,9 +28,6 @@ enum class ConsentAnswer { kYes, kNo, kInvalid };
 /// `in`; prints the outcome's line.
 ConsentAnswer askConsent(std::FILE* in, std::FILE* out);
 
-/// The whole program: options, consent, one scan. Returns the exit code.
-int runAgent(int argc, char** argv);
-
 }  // namespace cvn
 
 #endif  // CVN_MAIN_COMMAND_LINE_H_

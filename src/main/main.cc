@@ -1,3 +1,3 @@
-#include "main/command_line.h"
+#include "main/agent.h"
 
 int main(int argc, char** argv) { return cvn::runAgent(argc, argv); }

@@ -1,71 +1,36 @@
 #include "main/scan_driver.h"
 
-#include <unistd.h>
-
 #include <cctype>
 #include <climits>
-#include <cstdlib>
-#include <ctime>
-#include <memory>
 
-#include "asset/asset_info.h"
 #include "collect/command_runner.h"
-#include "collect/network_identity.h"
-#include "collect/plist.h"
-#include "collect/plist_converter.h"
-#include "collect/process_table.h"
 #include "collect/profiler_collector.h"
-#include "collect/quick_facts.h"
-#include "main/post_processor.h"
-#include "zxml/QAXfile.h"
-#include "zxml/tag.h"
+#include "main/result_directory.h"
 
 namespace cvn {
 namespace {
 
-std::string currentDirectory() {
-  // getcwd with a system-allocated buffer: no length limit of our own.
-  std::unique_ptr<char, decltype(&std::free)> cwd(::getcwd(nullptr, 0), &std::free);
-  return cwd ? std::string(cwd.get()) : std::string(".");
-}
-
-bool fileExists(const std::string& path) {
-  std::FILE* f = std::fopen(path.c_str(), "r");
-  if (!f) return false;
-  std::fclose(f);
-  return true;
-}
-
-AssetIdentity assetIdentityOf(const NetworkIdentity& network, const std::string& computer_name,
-                              const std::string& ip, const std::string& login) {
-  AssetIdentity asset;
-  asset.workgroup = network.workgroup;
-  asset.computer_name = computer_name;
-  asset.netbios_name = network.netbios_name;
-  asset.mac_address = network.mac_address;
-  asset.ip = ip;
-  asset.login = login;
-  asset.manual_ip = network.manual;
-  return asset;
-}
-
-}  // namespace
-
-std::string chooseResultName(const std::string& directory, const std::string& host,
+// "HOST_ADDR.qax", or "HOST_ADDR(N).qax" for the first N from 1 that is
+// free. The host part is upper-cased, the dashes leave the address. Returns
+// the bare file name; `full_path` gets directory/name.
+std::string chooseResultName(ResultDirectory& directory, const std::string& host,
                              const std::string& mac_address, std::string* full_path) {
   std::string host_part;
   for (char c : host) host_part += static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
   std::string address_part;
   for (char c : mac_address)
     if (c != '-') address_part += c;
+  const std::string folder = directory.path();
   std::string name = host_part + "_" + address_part + ".qax";
-  *full_path = directory + "/" + name;
-  for (int counter = 1; fileExists(*full_path) && counter < INT_MAX; ++counter) {
+  *full_path = folder + "/" + name;
+  for (int counter = 1; directory.isTaken(*full_path) && counter < INT_MAX; ++counter) {
     name = host_part + "_" + address_part + "(" + std::to_string(counter) + ").qax";
-    *full_path = directory + "/" + name;
+    *full_path = folder + "/" + name;
   }
   return name;
 }
+
+}  // namespace
 
 void ScanDriver::log(bool enabled, const char* text) {
   if (!enabled) return;
@@ -73,119 +38,50 @@ void ScanDriver::log(bool enabled, const char* text) {
   std::fflush(tools_.out);
 }
 
-void ScanDriver::run(const OutputSettings& output, bool silent, bool debug, std::string ip,
-                     const std::string& login) {
+void ScanDriver::run(const OutputSettings& output, const ScanOptions& options) {
   if (output.abort_flag) return;
-  if (debug) {
-    runDebug(output, silent, std::move(ip), login);
-  } else {
-    runNormal(output, silent, std::move(ip), login);
-  }
-}
-
-void ScanDriver::runNormal(const OutputSettings& output, bool silent, std::string ip,
-                           const std::string& login) {
   const bool logging = output.progress_log != 0;
-  const bool native = output.tree_flag != 0;
-  std::time_t start = std::time(nullptr);
+  ScanRequest request;
+  request.native = output.tree_flag != 0;
+  request.ip = options.ip;
+  request.login = options.login;
+  ScanResult result;
+  if (options.debug) {
+    // Deliberately unbounded, like the collector: a profiler that never
+    // answers keeps the debug scan waiting.
+    std::string document;
+    do {
+      document = tools_.sources.runner.run("system_profiler -detailLevel full -xml", 65536);
+    } while (document.empty());
+    result = runDebugPipeline(document, request, tools_.sources);
+    // The debug scan prints no stage texts.
+    saveAndReport(result.image, false, options.silent, result.host, result.mac_address);
+    return;
+  }
+
+  request.start_time = tools_.sources.clock.now();
+  request.log = logging ? tools_.out : nullptr;
   log(logging, "------Start Log------\n");
   log(logging, "I. Collecting Data....\n");
   std::vector<size_t> part_ends;
-  std::string document = ProfilerCollector(tools_.runner).collect(logging, tools_.out, &part_ends);
+  std::string document =
+      ProfilerCollector(tools_.sources.runner).collect(logging, tools_.out, &part_ends);
   log(logging, "done\n");
-
-  // A document that cannot be read leaves the trees without profiler data;
-  // the scan still writes its file.
-  PlistValue plist;
-  parseCollectedDocument(document, part_ends, &plist);
-  document = std::string();
-
-  QuickFacts facts = readQuickFacts(plist, tools_.runner);
-  auto raw = std::make_unique<TagTree>(native, "Macintosh");
-  log(logging, "II. Parsing Data....");
-  PlistConverter(*raw).convertPlist(plist);
-  log(logging, "done\n");
-  log(logging, "III. Get Data For AssetInfo....");
-  NetworkIdentity identity;
-  readNetworkIdentity(plist, ip, &identity);
-  log(logging, "33% ");
-  std::string serial = readSerialNumber(plist);
-  log(logging, "66% ");
-  plist = PlistValue();
-  collectProcesses(*raw, tools_.processes, tools_.runner);
-  log(logging, "100% done\n");
-
-  TagTree snapshot(native, "Snapshot");
-  postProcess(snapshot, *raw, logging, tools_.runner, tools_.files, tools_.out);
-  std::time_t end = std::time(nullptr);
-
-  std::string computer_name = tools_.computer_name ? tools_.computer_name() : std::string();
-  // The short form is made and thrown away, as the long form replaces it.
-  std::string date = SnapshotFile::makeTimestamp(false);
-  date = SnapshotFile::makeTimestamp(true);
-
-  snapshot.setValue("/timestamp", TagValue(date));
-  snapshot.setValue("/scan-time", TagValue(static_cast<int64_t>(end - start) * 1000));
-  snapshot.setValue("/client-version", TagValue("14.10.29.0"));
-  snapshot.setValue("/scan-subtype", TagValue("sstService"));
-  snapshot.setValue("/snaptype", TagValue("mac:1"));
-  snapshot.setValue("/hostname", TagValue(identity.netbios_name));
-  snapshot.setValue("/domain", TagValue(identity.workgroup));
-  snapshot.setValue("/user-name", TagValue(facts.user_name));
-  snapshot.setValue("/ip-address", TagValue(ip));
-
-  log(logging, "V. Creating AssetInfo Section....");
-  AssetIdentity asset = assetIdentityOf(identity, computer_name, ip, login);
-  asset.serial_number = serial;
-  std::unique_ptr<TagTree> asset_tree =
-      buildAssetInfo(output.tree_flag, snapshot, date, facts, asset);
-  log(logging, "done\n");
-
-  SnapshotFile file(native);
-  file.addTree(snapshot, kSnapshotBlock, false, true);
-  file.addTree(*asset_tree, kAssetInfoBlock, false, true);
-  raw.reset();
-
-  std::string host = identity.netbios_name.empty() ? computer_name : identity.netbios_name;
-  saveAndReport(file, output, silent, host, identity.mac_address);
+  result = runScanPipeline(std::move(document), part_ends, request, tools_.sources);
+  // The trees are done with once the image exists.
+  result.snapshot.reset();
+  result.asset_info.reset();
+  saveAndReport(result.image, logging, options.silent, result.host, result.mac_address);
 }
 
-void ScanDriver::runDebug(const OutputSettings& output, bool silent, std::string ip,
-                          const std::string& login) {
-  std::string document;
-  // Deliberately unbounded, like the collector: a profiler that never
-  // answers keeps the debug scan waiting.
-  do {
-    document = tools_.runner.run("system_profiler -detailLevel full -xml", 65536);
-  } while (document.empty());
-
-  PlistValue plist;
-  parsePlist(document, &plist);
-  NetworkIdentity identity;
-  readNetworkIdentity(plist, ip, &identity);
-  plist = PlistValue();
-
-  SnapshotFile file(output.tree_flag != 0);
-  std::string computer_name = tools_.computer_name ? tools_.computer_name() : std::string();
-  std::string host = identity.netbios_name.empty() ? computer_name : identity.netbios_name;
-  AssetIdentity asset = assetIdentityOf(identity, computer_name, ip, login);
-  addDebugAssetInfo(file, output.tree_flag, host, asset, document);
-
-  OutputSettings quiet = output;
-  quiet.progress_log = 0;  // the debug scan prints no stage texts
-  saveAndReport(file, quiet, silent, host, identity.mac_address);
-}
-
-void ScanDriver::saveAndReport(SnapshotFile& file, const OutputSettings& output, bool silent,
+void ScanDriver::saveAndReport(const std::vector<uint8_t>& image, bool logging, bool silent,
                                const std::string& host, const std::string& mac_address) {
-  const bool logging = output.progress_log != 0;
-  std::string directory = currentDirectory();
   log(logging, "VI. Generating File name....");
   std::string full_path;
-  std::string name = chooseResultName(directory, host, mac_address, &full_path);
+  std::string name = chooseResultName(tools_.directory, host, mac_address, &full_path);
   log(logging, "done\n");
   log(logging, "VII. Saving to file....");
-  bool saved = file.save(full_path, true);
+  bool saved = tools_.directory.writeFile(full_path, image);
   log(logging, "done\n");
   log(logging, "------End Log------\n");
   if (!saved) {

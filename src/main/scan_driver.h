@@ -1,53 +1,48 @@
-// Runs one scan from start to finish: collect, parse, convert, build the
-// sections and the asset tree, and save them under a name that never
-// overwrites an earlier result.
+// Runs one scan from start to finish: collect, hand the document to the scan
+// pipeline, and save the result under a name that never overwrites an
+// earlier one.
 #ifndef CVN_MAIN_SCAN_DRIVER_H_
 #define CVN_MAIN_SCAN_DRIVER_H_
 
+#include <cstdint>
 #include <cstdio>
-#include <functional>
 #include <string>
+#include <vector>
 
+#include "main/scan_pipeline.h"
 #include "main/scan_settings.h"
 
 namespace cvn {
 
-class CommandRunner;
-class FileSystem;
-class ProcessTable;
+class ResultDirectory;
 
-/// What the scan reads the machine through; tests swap in fakes.
+/// Everything the driver reaches the machine through; tests swap in fakes.
 struct ScanTools {
-  CommandRunner& runner;
-  ProcessTable& processes;
-  FileSystem& files;
-  std::function<std::string()> computer_name;
+  ScanSources sources;
+  ResultDirectory& directory;
   std::FILE* out = stdout;
   std::FILE* err = stderr;
 };
 
-/// "HOST_ADDR.qax" in `directory`, or "HOST_ADDR(N).qax" for the first N
-/// from 1 that is free. The host part is upper-cased, the dashes leave the
-/// address. Returns the bare file name; `full_path` gets directory/name.
-std::string chooseResultName(const std::string& directory, const std::string& host,
-                             const std::string& mac_address, std::string* full_path);
+/// The command line's choices for one scan.
+struct ScanOptions {
+  bool silent = false;
+  bool debug = false;
+  /// Empty means "find it".
+  std::string ip;
+  std::string login;
+};
 
 class ScanDriver {
  public:
   explicit ScanDriver(ScanTools tools) : tools_(std::move(tools)) {}
 
-  /// `ip` is the command line's address; empty means "find it".
-  void run(const OutputSettings& output, bool silent, bool debug, std::string ip,
-           const std::string& login);
+  void run(const OutputSettings& output, const ScanOptions& options);
 
  private:
-  void runNormal(const OutputSettings& output, bool silent, std::string ip,
-                 const std::string& login);
-  void runDebug(const OutputSettings& output, bool silent, std::string ip,
-                const std::string& login);
   void log(bool enabled, const char* text);
   /// Stages VI and VII and the report line.
-  void saveAndReport(class SnapshotFile& file, const OutputSettings& output, bool silent,
+  void saveAndReport(const std::vector<uint8_t>& image, bool logging, bool silent,
                      const std::string& host, const std::string& mac_address);
 
   ScanTools tools_;

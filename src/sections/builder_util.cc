@@ -1,6 +1,5 @@
 #include "sections/builder_util.h"
 
-#include <cstdarg>
 #include <cstdio>
 
 #include "zxml/size_text.h"
@@ -77,23 +76,6 @@ int64_t sizeInMegabytes(std::string_view size_text) {
 Tag& addComplexRecord(Tag& parent, std::string_view name) {
   parent.setProperty(name, TagValue(""), "complex", "");
   return parent.addChild(name);
-}
-
-std::string formatText(const char* format, ...) {
-  va_list args;
-  va_start(args, format);
-  va_list copy;
-  va_copy(copy, args);
-  int n = std::vsnprintf(nullptr, 0, format, copy);
-  va_end(copy);
-  std::string out;
-  if (n > 0) {
-    out.resize(static_cast<size_t>(n) + 1);
-    std::vsnprintf(&out[0], out.size(), format, args);
-    out.resize(static_cast<size_t>(n));
-  }
-  va_end(args);
-  return out;
 }
 
 }  // namespace cvn

@@ -8,6 +8,7 @@
 #include <string>
 #include <string_view>
 
+#include "zxml/format_text.h"
 #include "zxml/tag.h"
 
 namespace cvn {
@@ -46,9 +47,6 @@ int64_t truncateToInt64(double value);
 /// A complex record: the parent gets an empty-text property named `name`
 /// annotated "complex", then the child tag of that name is added.
 Tag& addComplexRecord(Tag& parent, std::string_view name);
-
-/// printf into a std::string.
-std::string formatText(const char* format, ...) __attribute__((format(printf, 1, 2)));
 
 }  // namespace cvn
 

@@ -2,7 +2,7 @@
 
 #include <cmath>
 
-#include "sections/builder_util.h"
+#include "zxml/format_text.h"
 
 namespace cvn {
 namespace {

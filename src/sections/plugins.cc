@@ -32,8 +32,8 @@ std::string nameFromFolder(const std::string& folder) {
 
 std::string firstString(const PlistValue& info, std::initializer_list<std::string_view> keys) {
   for (std::string_view key : keys) {
-    const PlistValue* value = info.find(key);
-    if (value && value->isString() && !value->text.empty()) return value->text;
+    const std::string* text = info.findText(key);
+    if (text && !text->empty()) return *text;
   }
   return std::string();
 }

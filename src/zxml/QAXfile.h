@@ -16,7 +16,7 @@ class TagTree;
 enum SnapshotBlockType : int { kAssetInfoBlock = 0, kSnapshotBlock = 1, kCustomDataBlock = 2 };
 
 struct SnapshotBlock {
-  int type = kSnapshotBlock;
+  SnapshotBlockType type = kSnapshotBlock;
   /// The bytes were supplied ready-made (raw data), not made from a tree.
   bool raw = false;
   bool compressed = false;
@@ -30,6 +30,9 @@ struct SnapshotBlock {
   uint64_t length() const { return data.size(); }
 };
 
+/// SnapshotFile::save's flag for a deflated directory.
+inline constexpr bool kCompressedDirectory = true;
+
 class SnapshotFile {
  public:
   /// `little_endian` selects the byte order of the directory offset in the
@@ -37,7 +40,7 @@ class SnapshotFile {
   explicit SnapshotFile(bool little_endian) : little_endian_(little_endian) {}
 
   /// Serialises `tree` now and appends it as a block of `type`.
-  void addTree(const TagTree& tree, int type, bool split, bool compressed);
+  void addTree(const TagTree& tree, SnapshotBlockType type, bool split, bool compressed);
   /// Compresses `bytes` into a custom-data block (a bare zlib stream).
   void addRawData(const uint8_t* bytes, size_t length);
   /// Writes the file in one piece; false if it cannot be created or written.
@@ -48,6 +51,8 @@ class SnapshotFile {
   /// Now, local time: "yyyyMMddHHmmss.000000" and the zone in minutes
   /// ("+180", "-300", "+0"), or "yyyy-MM-dd" for the short form.
   static std::string makeTimestamp(bool long_form);
+  /// The same for the time `now` (seconds since 1970).
+  static std::string makeTimestamp(bool long_form, int64_t now);
 
   const std::vector<std::unique_ptr<SnapshotBlock>>& blocks() const { return blocks_; }
   bool hasRawData() const { return has_raw_data_; }
@@ -60,6 +65,10 @@ class SnapshotFile {
   bool has_raw_data_ = false;
   std::vector<std::unique_ptr<SnapshotBlock>> blocks_;
 };
+
+/// Writes `image` as the whole file `file_name`; false when it cannot be
+/// created or written.
+bool writeImageFile(const std::string& file_name, const std::vector<uint8_t>& image);
 
 }  // namespace cvn
 

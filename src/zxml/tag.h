@@ -183,6 +183,17 @@ class Tag {
   std::unique_ptr<std::unordered_map<std::string, TagProperty*>> property_index_;
 };
 
+/// Names for the flags of dumpText, serialise and SnapshotFile::addTree, so
+/// that calls read as what they ask for.
+inline constexpr bool kCloseTags = false;
+inline constexpr bool kLeaveTagsOpen = true;
+inline constexpr bool kWithChildren = false;
+inline constexpr bool kWithoutChildren = true;
+inline constexpr bool kWholeText = false;
+inline constexpr bool kSplitSections = true;
+inline constexpr bool kCompressed = true;
+inline constexpr bool kUncompressed = false;
+
 /// An unnamed document tag whose first child is the top tag ("Macintosh",
 /// "Snapshot", "AssetInfo"). Serialising lives in zxml/zXML.
 class TagTree {

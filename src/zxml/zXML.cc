@@ -90,7 +90,7 @@ char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
   }
   if (!branch) return out;
   if (!no_children)
-    for (const auto& c : tag.children()) out = writeTag(out, *c, false, false);
+    for (const auto& c : tag.children()) out = writeTag(out, *c, kCloseTags, kWithChildren);
   if (!no_close) {
     *out++ = '-';
     *out++ = '\n';
@@ -123,7 +123,7 @@ std::vector<uint8_t> serialiseSplit(const TagTree& tree, bool compressed) {
   std::vector<char> buffer(tree.textSize() + 1, '\0');
   std::string directory;
   char* start = buffer.data();
-  char* out = start + tree.dumpText(start, 0, true, true);
+  char* out = start + tree.dumpText(start, 0, kLeaveTagsOpen, kWithoutChildren);
   auto addSection = [&](const std::string& name, const char* begin, const char* end) {
     std::string line = "[" + name + "]\noffset=" + std::to_string(begin - start) +
                        "\nlength=" + std::to_string(end - begin) + "\n";
@@ -132,7 +132,7 @@ std::vector<uint8_t> serialiseSplit(const TagTree& tree, bool compressed) {
   addSection("Root", start, out);
   for (const auto& child : tree.top().children()) {
     char* begin = out;
-    out = writeTag(out, *child, false, false);
+    out = writeTag(out, *child, kCloseTags, kWithChildren);
     addSection(child->name(), begin, out);
   }
   size_t directory_position = static_cast<size_t>(out - start);
@@ -208,12 +208,12 @@ std::vector<uint8_t> TagTree::serialise(bool compressed, bool split) const {
     // The text padded with zeros to the estimated size; the zeros stand in
     // for the split and compressed flags.
     std::vector<uint8_t> block(size + 1, 0);
-    dumpText(reinterpret_cast<char*>(block.data()), 0, false, false);
+    dumpText(reinterpret_cast<char*>(block.data()), 0, kCloseTags, kWithChildren);
     block.resize(size);
     return block;
   }
   std::vector<char> text(size, '\0');
-  size_t length = dumpText(text.data(), 0, false, false);
+  size_t length = dumpText(text.data(), 0, kCloseTags, kWithChildren);
   static constexpr uint8_t kTrailer[] = {0x00, 0x01, 'Z', 'X', 'M', 'L'};
   std::vector<uint8_t> block = compressLevel9(reinterpret_cast<const uint8_t*>(text.data()), length,
                                               kZxmlModule, sizeof kTrailer);

@@ -1,0 +1,285 @@
+#include "collect/plist_bytes.h"
+
+#include <cstdint>
+#include <cstring>
+
+#include "collect/plist_leaves.h"
+
+namespace cvn {
+namespace {
+
+constexpr uint32_t kEscapeBase = 0xF700;
+constexpr uint32_t kPoison = 0xF800;
+constexpr uint32_t kPrivateLast = 0xF8FF;
+
+void appendUtf8(std::string& out, uint32_t cp) {
+  if (cp < 0x80) {
+    out += static_cast<char>(cp);
+  } else if (cp < 0x800) {
+    out += static_cast<char>(0xC0 | (cp >> 6));
+    out += static_cast<char>(0x80 | (cp & 0x3F));
+  } else if (cp < 0x10000) {
+    out += static_cast<char>(0xE0 | (cp >> 12));
+    out += static_cast<char>(0x80 | ((cp >> 6) & 0x3F));
+    out += static_cast<char>(0x80 | (cp & 0x3F));
+  } else {
+    out += static_cast<char>(0xF0 | (cp >> 18));
+    out += static_cast<char>(0x80 | ((cp >> 12) & 0x3F));
+    out += static_cast<char>(0x80 | ((cp >> 6) & 0x3F));
+    out += static_cast<char>(0x80 | (cp & 0x3F));
+  }
+}
+
+void appendEscapedByte(std::string& out, unsigned char b) { appendUtf8(out, kEscapeBase + b); }
+
+void appendEscapedCodePoint(std::string& out, uint32_t cp) {
+  std::string bytes;
+  appendUtf8(bytes, cp);
+  for (char b : bytes) appendEscapedByte(out, static_cast<unsigned char>(b));
+}
+
+bool isContinuation(unsigned char b) { return (b & 0xC0) == 0x80; }
+
+// Length of the UTF-8 sequence at p that expat accepts as one character, or
+// 0 when the bytes are not such a sequence.
+size_t sequenceLength(const unsigned char* p, size_t n, uint32_t* cp) {
+  unsigned char b = p[0];
+  size_t len;
+  unsigned char lo = 0x80, hi = 0xBF;
+  if (b >= 0xC2 && b <= 0xDF) {
+    len = 2;
+  } else if (b >= 0xE0 && b <= 0xEF) {
+    len = 3;
+    if (b == 0xE0) lo = 0xA0;
+    if (b == 0xED) hi = 0x9F;  // surrogates
+  } else if (b >= 0xF0 && b <= 0xF4) {
+    len = 4;
+    if (b == 0xF0) lo = 0x90;
+    if (b == 0xF4) hi = 0x8F;
+  } else {
+    return 0;
+  }
+  if (n < len || p[1] < lo || p[1] > hi) return 0;
+  for (size_t k = 2; k < len; ++k)
+    if (!isContinuation(p[k])) return 0;
+  uint32_t value = b & (len == 2 ? 0x1F : len == 3 ? 0x0F : 0x07);
+  for (size_t k = 1; k < len; ++k) value = (value << 6) | (p[k] & 0x3F);
+  if (value == 0xFFFE || value == 0xFFFF) return 0;  // not XML characters
+  *cp = value;
+  return len;
+}
+
+bool isXmlChar(uint32_t cp) {
+  if (cp < 0x20) return cp == 0x09 || cp == 0x0A || cp == 0x0D;
+  if (cp >= 0xD800 && cp <= 0xDFFF) return false;
+  if (cp == 0xFFFE || cp == 0xFFFF) return false;
+  return cp <= 0x10FFFF;
+}
+
+class Cleaner {
+ public:
+  explicit Cleaner(std::string_view in)
+      : p_(reinterpret_cast<const unsigned char*>(in.data())), n_(in.size()) {}
+
+  std::string run();
+
+ private:
+  enum class State { kText, kTag, kComment, kProcessing, kCData, kDeclaration };
+
+  bool startsWith(const char* s) const {
+    size_t len = std::strlen(s);
+    return n_ - i_ >= len && std::memcmp(p_ + i_, s, len) == 0;
+  }
+  void copy(size_t len) {
+    out_.append(reinterpret_cast<const char*>(p_ + i_), len);
+    i_ += len;
+  }
+  // One character of content: control bytes, stray bytes and our own private
+  // range are escaped, everything else is copied.
+  void copyContentByte(bool escape_cr);
+  void copyReference();
+
+  const unsigned char* p_;
+  size_t n_;
+  size_t i_ = 0;
+  std::string out_;
+};
+
+void Cleaner::copyContentByte(bool escape_cr) {
+  unsigned char c = p_[i_];
+  if (c < 0x80) {
+    bool refused = c < 0x20 && c != '\t' && c != '\n' && (c != '\r' || escape_cr);
+    if (refused) {
+      appendEscapedByte(out_, c);
+    } else {
+      out_ += static_cast<char>(c);
+    }
+    ++i_;
+    return;
+  }
+  uint32_t cp = 0;
+  size_t len = sequenceLength(p_ + i_, n_ - i_, &cp);
+  if (len == 0) {
+    appendEscapedByte(out_, c);
+    ++i_;
+  } else if (cp >= kEscapeBase && cp <= kPrivateLast) {
+    for (size_t k = 0; k < len; ++k) appendEscapedByte(out_, p_[i_ + k]);
+    i_ += len;
+  } else {
+    copy(len);
+  }
+}
+
+void Cleaner::copyReference() {
+  static const char* const kPredefined[] = {"&lt;", "&gt;", "&amp;", "&apos;", "&quot;"};
+  for (const char* name : kPredefined) {
+    if (startsWith(name)) {
+      copy(std::strlen(name));
+      return;
+    }
+  }
+  if (startsWith("&#")) {
+    size_t j = i_ + 2;
+    bool hex = j < n_ && p_[j] == 'x';
+    if (hex) ++j;
+    uint32_t value = 0;
+    size_t digits = 0;
+    for (unsigned d = 0; j < n_ && digits <= 8 && digitValue(p_[j], hex, &d); ++j, ++digits)
+      value = value * (hex ? 16 : 10) + d;
+    if (digits > 0 && digits <= 8 && j < n_ && p_[j] == ';') {
+      size_t len = j + 1 - i_;
+      if (value < 0x20 && value != '\t' && value != '\n' && value != '\r') {
+        appendEscapedByte(out_, static_cast<unsigned char>(value));
+        i_ += len;
+        return;
+      }
+      if (value >= kEscapeBase && value <= kPrivateLast) {
+        appendEscapedCodePoint(out_, value);
+        i_ += len;
+        return;
+      }
+      if (isXmlChar(value)) {
+        copy(len);
+        return;
+      }
+    }
+  }
+  // Anything else makes CoreFoundation refuse the value: mark it and let the
+  // rest of the reference pass as plain text.
+  appendUtf8(out_, kPoison);
+  ++i_;
+}
+
+std::string Cleaner::run() {
+  out_.reserve(n_ + n_ / 32 + 16);
+  // CoreFoundation takes blanks before the declaration; expat does not.
+  size_t lead = 0;
+  while (lead < n_ && (p_[lead] == ' ' || p_[lead] == '\t' || p_[lead] == '\r' || p_[lead] == '\n'))
+    ++lead;
+  if (lead > 0 && n_ - lead >= 5 && std::memcmp(p_ + lead, "<?xml", 5) == 0) i_ = lead;
+
+  State state = State::kText;
+  bool root_started = false;
+  unsigned char quote = 0;
+  int brackets = 0;
+  int closing_brackets = 0;  // "]" run in text, for "]]>"
+  while (i_ < n_) {
+    unsigned char c = p_[i_];
+    switch (state) {
+      case State::kText:
+        if (c == '<') {
+          closing_brackets = 0;
+          if (startsWith("<!--")) {
+            state = State::kComment;
+            copy(4);
+          } else if (startsWith("<![CDATA[")) {
+            state = State::kCData;
+            copy(9);
+          } else if (startsWith("<?")) {
+            state = State::kProcessing;
+            copy(2);
+          } else if (startsWith("<!")) {
+            state = State::kDeclaration;
+            brackets = 0;
+            quote = 0;
+            copy(2);
+          } else {
+            if (i_ + 1 < n_ && p_[i_ + 1] != '/') root_started = true;
+            state = State::kTag;
+            quote = 0;
+            copy(1);
+          }
+        } else if (c == '&') {
+          closing_brackets = 0;
+          copyReference();
+        } else if (c == '>' && closing_brackets >= 2) {
+          closing_brackets = 0;
+          appendEscapedByte(out_, c);
+          ++i_;
+        } else {
+          closing_brackets = c == ']' ? closing_brackets + 1 : 0;
+          // Blanks of the prolog are markup; CR there must stay a blank.
+          copyContentByte(root_started);
+        }
+        break;
+      case State::kCData:
+      case State::kComment:
+        // Character data either way; only CDATA keeps its CR bytes.
+        if (startsWith(state == State::kCData ? "]]>" : "-->")) {
+          state = State::kText;
+          copy(3);
+        } else {
+          copyContentByte(state == State::kCData);
+        }
+        break;
+      case State::kProcessing:
+        if (startsWith("?>")) state = State::kText;
+        copy(state == State::kText ? 2 : 1);
+        break;
+      case State::kTag:
+      case State::kDeclaration:
+        // Quoted text hides markup in both; only a declaration nests "[...]".
+        if (quote) {
+          if (c == quote) quote = 0;
+        } else if (c == '"' || c == '\'') {
+          quote = c;
+        } else if (state == State::kDeclaration && (c == '[' || c == ']')) {
+          brackets += c == '[' ? 1 : -1;
+        } else if (c == '>' && (state == State::kTag || brackets <= 0)) {
+          state = State::kText;
+        }
+        copy(1);
+        break;
+    }
+  }
+  return std::move(out_);
+}
+
+}  // namespace
+
+bool restoreEscapedBytes(std::string& s) {
+  size_t pos = s.find('\xEF');
+  if (pos == std::string::npos) return true;
+  size_t w = pos;
+  bool clean = true;
+  for (size_t r = pos; r < s.size();) {
+    unsigned char b = static_cast<unsigned char>(s[r]);
+    if (b == 0xEF && r + 2 < s.size()) {
+      unsigned char b1 = static_cast<unsigned char>(s[r + 1]);
+      unsigned char b2 = static_cast<unsigned char>(s[r + 2]);
+      if (b1 >= 0x9C && b1 <= 0x9F && isContinuation(b2)) {
+        s[w++] = static_cast<char>(((b1 & 0x03) << 6) | (b2 & 0x3F));
+        r += 3;
+        continue;
+      }
+      if (b1 >= 0xA0 && b1 <= 0xA3 && isContinuation(b2)) clean = false;
+    }
+    s[w++] = s[r++];
+  }
+  s.resize(w);
+  return clean;
+}
+
+std::string escapeRefusedBytes(std::string_view document) { return Cleaner(document).run(); }
+
+}  // namespace cvn

@@ -1,0 +1,16 @@
+// The inspector's JSON view of a whole result file.
+#ifndef CVN_TOOLS_QAX_JSON_H_
+#define CVN_TOOLS_QAX_JSON_H_
+
+#include <string>
+
+#include "qax_reader.h"
+
+namespace cvn {
+
+/// The directory and the trees as JSON.
+std::string renderQaxJson(const QaxFile& file);
+
+}  // namespace cvn
+
+#endif  // CVN_TOOLS_QAX_JSON_H_
