@@ -107,7 +107,14 @@ done
 if [ -n "$lipo" ]; then
   for program in cvnmacagent qaxdump; do
     "$lipo" -create "$out/x86_64/$program" "$out/arm64/$program" -output "$out/$program"
-    echo "   $program (universal): $(file -b "$out/$program" | head -n 1)"
+    case "$(file -b "$out/$program")" in
+      "Mach-O universal binary with 2 architectures"*) ;;
+      *)
+        echo "build-macos: $program is not a universal Mach-O binary" >&2
+        exit 1
+        ;;
+    esac
+    echo "   $program (universal): $("$lipo" "$out/$program" -archs)"
   done
 else
   echo "-- no lipo tool here: no universal binaries, only build-macos/ARCH/"
