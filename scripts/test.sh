@@ -1,9 +1,10 @@
 #!/usr/bin/env bash
 # The whole test suite: formatting, a release build and an AddressSanitizer +
 # UndefinedBehaviorSanitizer build, both with warnings as errors, then the
-# fuzz targets for a bounded time. Every stage goes on after a failure and
-# reports into one tally; the last line is the verdict "N passed, N failed"
-# and the exit status is non-zero when anything failed.
+# fuzz targets for a bounded time, then the macOS cross-build. Every stage
+# goes on after a failure and reports into one tally; the last line is the
+# verdict "N passed, N failed" and the exit status is non-zero when anything
+# failed.
 set -uo pipefail
 cd "$(dirname "$0")/.."
 
@@ -110,6 +111,25 @@ if CXX=clang++ build build-fuzz -DCMAKE_BUILD_TYPE=RelWithDebInfo -DCVN_FUZZ=ON 
     grep -aE '^#[0-9]+ +(DONE|INITED)|stat::number_of_executed_units|deadly|ERROR' "$log" | tail -n 4
     rm -rf "$work"
   done
+fi
+
+# The macOS cross-build, after the Linux builds: it compiles and links the
+# *_darwin.cc files no Linux build sees. A stage of its own, with its own
+# verdict line, counted as one in the tally.
+macos_stage() {
+  echo "== macOS cross-build (x86_64 and arm64)"
+  local start=$SECONDS
+  if bash scripts/build-macos.sh; then
+    echo "macOS stage: passed in $((SECONDS - start)) s"
+  else
+    echo "macOS stage: FAILED after $((SECONDS - start)) s"
+    return 1
+  fi
+}
+if macos_stage; then
+  report 1 0
+else
+  report 0 1
 fi
 
 finish
