@@ -33,15 +33,34 @@ enum class Element {
   kUnknown
 };
 
+// Called for every element of the document: one comparison, not eleven.
 Element elementOf(const char* name) {
-  static const std::pair<const char*, Element> kNames[] = {
-      {"plist", Element::kPlist}, {"array", Element::kArray},   {"dict", Element::kDict},
-      {"key", Element::kKey},     {"string", Element::kString}, {"integer", Element::kInteger},
-      {"real", Element::kReal},   {"date", Element::kDate},     {"true", Element::kTrue},
-      {"false", Element::kFalse}, {"data", Element::kData}};
-  for (const auto& entry : kNames)
-    if (std::strcmp(name, entry.first) == 0) return entry.second;
-  return Element::kUnknown;
+  auto is = [name](const char* candidate) { return std::strcmp(name, candidate) == 0; };
+  switch (name[0]) {
+    case 'a':
+      return is("array") ? Element::kArray : Element::kUnknown;
+    case 'd':
+      return is("dict")   ? Element::kDict
+             : is("date") ? Element::kDate
+             : is("data") ? Element::kData
+                          : Element::kUnknown;
+    case 'f':
+      return is("false") ? Element::kFalse : Element::kUnknown;
+    case 'i':
+      return is("integer") ? Element::kInteger : Element::kUnknown;
+    case 'k':
+      return is("key") ? Element::kKey : Element::kUnknown;
+    case 'p':
+      return is("plist") ? Element::kPlist : Element::kUnknown;
+    case 'r':
+      return is("real") ? Element::kReal : Element::kUnknown;
+    case 's':
+      return is("string") ? Element::kString : Element::kUnknown;
+    case 't':
+      return is("true") ? Element::kTrue : Element::kUnknown;
+    default:
+      return Element::kUnknown;
+  }
 }
 
 struct Frame {
@@ -292,7 +311,8 @@ struct ParserFree {
 };
 
 bool Reader::read(std::string_view document, PlistValue* out, std::string* warning) {
-  std::string cleaned = escapeRefusedBytes(document);
+  std::string storage;
+  const std::string_view cleaned = escapeRefusedBytes(document, &storage);
   // The declared encoding is overridden: the cleaning works on UTF-8 bytes.
   std::unique_ptr<XML_ParserStruct, ParserFree> parser(XML_ParserCreate("UTF-8"));
   if (!parser) return false;
