@@ -2,6 +2,7 @@
 
 #include <cinttypes>
 #include <cstdio>
+#include <ctime>
 #include <deque>
 #include <vector>
 
@@ -42,7 +43,8 @@ TagValue leafValue(const PlistValue& value, bool top_level) {
     case PlistValue::Kind::kReal:
       return TagValue(value.real);
     case PlistValue::Kind::kDate: {
-      std::string text = formatLocalDate(value.integer, true);
+      // The zone was read once when the conversion began.
+      std::string text = formatLocalDateInCurrentZone(value.integer, true);
       if (text.empty()) return TagValue();
       return TagValue(std::move(text));
     }
@@ -70,10 +72,10 @@ struct PlistConverter::Node {
     return *tag;
   }
 
-  void store(std::string_view key, const TagValue& value) {
+  void store(std::string_view key, TagValue&& value) {
     if (value.isNone()) return;
     if (tag) {
-      tag->setProperty(key, value);
+      tag->setProperty(key, std::move(value));
       return;
     }
     if (!name.empty()) {
@@ -156,6 +158,7 @@ void PlistConverter::chainFor(std::string_view path, std::deque<Node>& chain) {
 
 void PlistConverter::convertPlist(const PlistValue& root) {
   if (!root.isArray()) return;
+  tzset();
   for (const PlistValue& element : root.array) {
     if (!element.isDictionary()) continue;
     const std::string* data_type = element.findText("_dataType");
@@ -176,18 +179,21 @@ void PlistConverter::convertPlist(const PlistValue& root) {
 }
 
 void PlistConverter::convertDictionary(const PlistValue& dictionary, std::string_view path) {
+  tzset();
   std::deque<Node> chain;
   chainFor(path, chain);
   walkDictionary(dictionary, chain.back(), 0);
 }
 
 void PlistConverter::convertArray(const PlistValue& array, std::string_view path) {
+  tzset();
   std::deque<Node> chain;
   chainFor(path, chain);
   walkArray(array, chain.back(), 0);
 }
 
 void PlistConverter::convertNamedList(const PlistValue& dictionary, std::string_view path) {
+  tzset();
   std::deque<Node> chain;
   chainFor(path, chain);
   walkNamedList(dictionary, chain.back());
