@@ -79,14 +79,10 @@ struct PlistConverter::Node {
       return;
     }
     if (!name.empty()) {
-      // The first leaf goes through the path setter one step up, which turns
-      // this tag into a branch just as a path from the top would.
-      Tag& above = parent->create();
-      std::string step = name;
-      step += '/';
-      step += key;
-      above.setPropertyByPath(step, value);
-      tag = above.findChild(name);
+      // The tag is made a branch, just as storing by a path from the top
+      // would step through it.
+      tag = &parent->create().addBranch(name);
+      tag->setProperty(key, std::move(value));
       return;
     }
     storeByFullPath(key, value);

@@ -215,6 +215,12 @@ Tag& Tag::addChild(std::string_view name) {
   return appendChild(name);
 }
 
+Tag& Tag::addBranch(std::string_view name) {
+  Tag& child = addChild(name);
+  child.makeBranch();
+  return child;
+}
+
 Tag& Tag::setChildValue(std::string_view name, const TagValue& value) {
   Tag& child = addChild(name);
   child.setValue(value);

@@ -130,6 +130,9 @@ class Tag {
 
   /// Get-or-add: the existing child of that name, else a new leaf child.
   Tag& addChild(std::string_view name);
+  /// addChild(name), and the child counts as a branch from now on, as a
+  /// path step through it leaves it, even while it holds only properties.
+  Tag& addBranch(std::string_view name);
   /// addChild(name), then the child's value becomes a copy of `value`.
   Tag& setChildValue(std::string_view name, const TagValue& value);
   void setValue(const TagValue& value);
