@@ -108,17 +108,14 @@ struct Section {
 };
 
 bool parseIni(std::string_view text, std::vector<Section>* sections, std::string* error) {
-  size_t line_number = 0;
-  size_t pos = 0;
-  while (pos < text.size()) {
-    ++line_number;
-    size_t end = text.find('\n', pos);
-    if (end == std::string_view::npos) {
+  TextLines lines(text, 0, 0);
+  std::string_view line;
+  for (TextLines::Step step; (step = lines.next(&line)) != TextLines::Step::kEnd;) {
+    const size_t line_number = lines.number();
+    if (step == TextLines::Step::kUnterminated) {
       *error = "directory line " + numberText(line_number) + ": no line feed at the end";
       return false;
     }
-    std::string_view line = text.substr(pos, end - pos);
-    pos = end + 1;
     if (line.size() >= 2 && line.front() == '[' && line.back() == ']') {
       sections->push_back(Section{std::string(line.substr(1, line.size() - 2)), line_number, {}});
       continue;

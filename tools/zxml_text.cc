@@ -31,17 +31,14 @@ bool parseZxml(std::string_view text, QaxTree* out, std::vector<std::string>* wa
   }
   ParseState st;
   st.tree = out;
-  size_t pos = kZxmlHeader.size();
-  size_t line_number = 1;
-  while (pos < text.size()) {
-    ++line_number;
-    size_t end = text.find('\n', pos);
-    if (end == std::string_view::npos) {
+  TextLines lines(text, kZxmlHeader.size(), 1);
+  std::string_view line;
+  for (TextLines::Step step; (step = lines.next(&line)) != TextLines::Step::kEnd;) {
+    const size_t line_number = lines.number();
+    if (step == TextLines::Step::kUnterminated) {
       *error = lineError(line_number, "no line feed at the end of the text");
       return false;
     }
-    std::string_view line = text.substr(pos, end - pos);
-    pos = end + 1;
     if (line.find('\0') != std::string_view::npos) {
       *error = lineError(line_number, "NUL byte");
       return false;
@@ -112,11 +109,12 @@ bool parseZxml(std::string_view text, QaxTree* out, std::vector<std::string>* wa
     }
   }
   if (out->nodes.empty()) {
-    *error = lineError(line_number, "no top tag");
+    *error = lineError(lines.number(), "no top tag");
     return false;
   }
   if (st.open.size() > allowed_open) {
-    *error = lineError(line_number, std::to_string(st.open.size()) + " tags still open at the end");
+    *error =
+        lineError(lines.number(), std::to_string(st.open.size()) + " tags still open at the end");
     return false;
   }
   return true;

@@ -13,6 +13,33 @@ namespace cvn {
 /// The first line of every ZXML text: a byte-order mark and "?zxml".
 inline constexpr std::string_view kZxmlHeader = "\xEF\xBB\xBF?zxml\n";
 
+/// Walks text made of lines that each end in a line feed, counting them.
+class TextLines {
+ public:
+  enum class Step { kLine, kEnd, kUnterminated };
+
+  TextLines(std::string_view text, size_t start, size_t first_number)
+      : text_(text), pos_(start), number_(first_number) {}
+  /// The next line, without its line feed; kUnterminated when the text ends
+  /// without one.
+  Step next(std::string_view* line) {
+    if (pos_ >= text_.size()) return Step::kEnd;
+    ++number_;
+    size_t end = text_.find('\n', pos_);
+    if (end == std::string_view::npos) return Step::kUnterminated;
+    *line = text_.substr(pos_, end - pos_);
+    pos_ = end + 1;
+    return Step::kLine;
+  }
+  /// The number of the line last returned (or found unterminated).
+  size_t number() const { return number_; }
+
+ private:
+  std::string_view text_;
+  size_t pos_;
+  size_t number_;
+};
+
 struct QaxAnnotation {
   std::string key;
   std::string text;
