@@ -103,23 +103,19 @@ scan() {
 }
 
 # Processes the agent started itself (its clone, fork and vfork calls), and
-# every process below it, from one run under strace.
+# every process below it, from one run under strace; into $direct and $all.
+# Run in this shell, not a subshell, so that cleanup can stop its scan.
 count_children() {
   local log=$work/strace.log
-  if ! command -v strace >/dev/null 2>&1; then
-    echo "- -"
-    return
-  fi
+  direct=- all=-
+  command -v strace >/dev/null 2>&1 || return 0
   local filter=
   strace --seccomp-bpf -f -o /dev/null true 2>/dev/null && filter=--seccomp-bpf
   scan strace $filter -f -qq -e trace=process -o "$log" "$agent" -silent
   local first
   first=$(awk 'NR == 1 {print $1}' "$log")
-  local direct
   direct=$(awk -v p="$first" '$1 == p && /(clone3?|v?fork)/ && /= [0-9]+$/' "$log" | wc -l)
-  local all
-  all=$(awk '{print $1}' "$log" | sort -u | wc -l)
-  echo "$direct $((all - 1))"
+  all=$(($(awk '{print $1}' "$log" | sort -u | wc -l) - 1))
 }
 
 echo "scan cost of $agent"
@@ -157,7 +153,7 @@ for size in $sizes; do
   done
   check_time
   direct=- all=-
-  if [ "$count" = 1 ] && ! grep -q '>' "$work/walls"; then read -r direct all < <(count_children); fi
+  if [ "$count" = 1 ] && ! grep -q '>' "$work/walls"; then count_children; fi
   if grep -q '>' "$work/walls"; then wall=$(head -n 1 "$work/walls"); else wall=$(median <"$work/walls"); fi
   printf '%-7s %-7s %-10s %-13s %-12s %-9s %-11s %s\n' "$size" "$table" "$wall" \
     "$(median <"$work/cpus")" "$(median <"$work/tools")" "$direct" "$all" "$(median <"$work/rss")"
