@@ -126,7 +126,9 @@ for size in $sizes; do
   check_time
   stop_idle
   start_idle "$size"
-  table=$(ls -d /proc/[0-9]* 2>/dev/null | wc -l)
+  # Counted by the shell's own glob: a process may end while it is listed.
+  procs=(/proc/[0-9]*)
+  table=${#procs[@]}
   : >"$work/walls"
   : >"$work/cpus"
   : >"$work/tools"
