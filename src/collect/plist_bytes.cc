@@ -86,8 +86,8 @@ struct PlainBytes {
       text[c] = c != '<' && c != '&' && c != '>' && c != ']';
       markup[c] = c != '"' && c != '\'' && c != '>' && c != '[' && c != ']';
     }
-    text['\t'] = text['\n'] = true;
-    markup['\t'] = markup['\n'] = markup['\r'] = true;
+    for (unsigned char c : {'\t', '\n'}) text[c] = markup[c] = true;
+    markup[static_cast<unsigned char>('\r')] = true;
     for (int c = 0x80; c < 0x100; ++c) markup[c] = true;
   }
 };
