@@ -1,5 +1,6 @@
 // Disk sizes from profiler outputs recorded on real Macs, each checked by eye
 // against the recording. Without the recordings the test skips.
+#include <filesystem>
 #include <string>
 
 #include <gtest/gtest.h>
@@ -9,6 +10,7 @@
 #include "corpus_files.h"
 #include "fake_command_runner.h"
 #include "sections/sections.h"
+#include "tree_text.h"
 #include "zxml/tag.h"
 
 namespace cvn {
@@ -45,6 +47,58 @@ TEST(DiskCorpusTest, DiskSizes) {
   EXPECT_EQ(diskSizes("SPUSBDataType.xml"), "Removable:1 537 500107859968\n");
   // A 10.6 profiler with letter-prefixed keys and no byte counts.
   EXPECT_EQ(diskSizes("SPUSBDataType2.xml"), "Removable:1 8\nRemovable:2 500\nRemovable:3 2\n");
+}
+
+// The whole Storage section of a recording, as text.
+std::string storageText(const std::filesystem::path& file) {
+  PlistValue root;
+  parsePlist(readWholeFile(findCorpus() / file), &root);
+  TagTree raw(true, "Macintosh");
+  PlistConverter(raw).convertPlist(root);
+  TagTree snapshot(true, "Snapshot");
+  buildStorageSection(snapshot, raw);
+  return treeText(snapshot.top().findChild("Storage"));
+}
+
+TEST(DiskCorpusTest, TodaysDiskTypes) {
+  if (findCorpus().empty()) GTEST_SKIP() << "no recorded outputs";
+  // An Apple Silicon Mac of 2026: only APFS containers, none of them a volume.
+  EXPECT_EQ(storageText("glpi-agent/resources/macos/system_profiler/SPNVMeDataType.xml"),
+            R"(+Storage=
++Physical-disks=
+*HDD:1=
+model="APPLE SSD AP0512Q"
+interface="NVMe"
+mediatype=3
+~type=media-type
+size=500
+~base-value=500277792768
+serial="0ba016ebe08d5c1d"
+fw-rev="561.100."
+partitions=0
+-
+-
+)");
+  // A 2016 Intel Mac's mounted volume, on CoreStorage, with byte counts only.
+  EXPECT_EQ(storageText("ohai/test-data/unit/plugins/darwin/"
+                        "hardware_system_profiler_output.rb.d/"
+                        "HardwareSystemProfilerOutput_Storage.xml"),
+            R"(+Storage=
++Logical-disks=
+*partition:1="Macintosh HD"
+file-sys="Journaled HFS+"
+size=249.66
+~base-value=249661751296
+free=23.86
+~base-value=23864803328
+mount-point="/"
+used%=90
+~pos=225.80
+~max=249.66
+~val-units=GB
+-
+-
+)");
 }
 
 }  // namespace

@@ -87,5 +87,66 @@ main-display="0"
 )tree");
 }
 
+// Apple Silicon: the built-in panel has no EDID and names its resolution
+// under a key of its own; a GPU without a display is an adapter only.
+TEST(DisplaysSectionTest, AppleSiliconPanelsWithoutEdidAndAGpuWithoutDisplays) {
+  TagTree raw(true, "Macintosh");
+  auto set = [&raw](const std::string& path, const TagValue& value) {
+    raw.setValue("/SPDisplaysDataType/_items/" + path, value);
+  };
+  set("item0/_name", "Apple M3 Pro");
+  set("item0/sppci_model", "Apple M3 Pro");
+  set("item0/sppci_cores", "18");
+  set("item0/spdisplays_vendor", "sppci_vendor_Apple");
+  set("item0/sppci_bus", "spdisplays_builtin");
+  const std::string panel = "item0/spdisplays_ndrvs/item0/";
+  set(panel + "_name", "Color LCD");
+  set(panel + "_spdisplays_pixels", "3024 x 1964");
+  set(panel + "_spdisplays_resolution", "1512 x 982 @ 120.00Hz");
+  set(panel + "spdisplays_main", "spdisplays_yes");
+  set(panel + "spdisplays_connection_type", "spdisplays_internal");
+  set("item0/spdisplays_ndrvs/item1/_name", "LG HDR 4K");
+  set("item0/spdisplays_ndrvs/item1/_spdisplays_pixels", "3840 x 2160");
+  set("item1/sppci_model", "Apple M3 Pro (second GPU)");
+
+  TagTree snapshot(true, "Snapshot");
+  buildDisplaysSection(snapshot, raw);
+  EXPECT_EQ(treeText(snapshot.top().findChild("Video")), R"tree(+Video=
++Video-devices=
+Video-adapter:1=""
+~complex=
+Video-adapter:2=""
+~complex=
+*Video-adapter:1=
+model="Apple M3 Pro"
+vendor="sppci_vendor_Apple"
+device-id=
+revision-id=
+bus="spdisplays_builtin"
+*Video-adapter:2=
+model="Apple M3 Pro (second GPU)"
+vendor=
+device-id=
+revision-id=
+bus=
+-
++Monitors=
+Monitor:1=""
+~complex=
+Monitor:2=""
+~complex=
+*Monitor:1=
+name="Color LCD"
+resolution="1512 x 982 @ 120.00Hz"
+main-display="1"
+*Monitor:2=
+name="LG HDR 4K"
+resolution="3840 x 2160"
+main-display="0"
+-
+-
+)tree");
+}
+
 }  // namespace
 }  // namespace cvn

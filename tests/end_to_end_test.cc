@@ -112,6 +112,41 @@ class EndToEndTest : public ::testing::Test {
   std::string root_, work_, state_, mac_dir_;
 };
 
+// What differs from run to run or host to host: the scan's clock, this
+// machine's own name, and its real process table and environment.
+void maskVolatileParts(QaxNode& node) {
+  for (QaxProperty& p : node.properties) {
+    for (const char* name : {"timestamp", "scan-time", "first-scan", "last-scan", "snapshot-list",
+                             "int-name", "alias"}) {
+      if (p.name == name) p.value = "<varies>";
+    }
+  }
+  for (QaxNode& child : node.children) {
+    if (child.name == "Processes" || child.name == "Environment") {
+      child.properties.clear();
+      child.children.clear();
+    }
+  }
+}
+
+/// Both trees of a result file as ZXML text, with the volatile parts masked.
+std::string stableResultText(QaxFile file) {
+  std::string text;
+  for (QaxBlock& block : file.blocks) {
+    text += "== " + block.type + "\n";
+    for (QaxNode& top : block.tree.nodes) maskVolatileParts(top);
+    text += renderZxmlText(block.tree);
+  }
+  return text;
+}
+
+/// Compares with the expected text committed beside a sample Mac; with
+/// CVN_UPDATE_EXPECTED set, rewrites that file instead.
+void expectSameAsCommitted(const std::string& actual, const std::string& path) {
+  if (std::getenv("CVN_UPDATE_EXPECTED")) writeFile(path, actual);
+  EXPECT_EQ(actual, readFile(path)) << "result differs from " << path;
+}
+
 TEST_F(EndToEndTest, SilentRunPrintsOnlyTheFileNameAndNeverOverwrites) {
   for (const char* expected : {"JANE-MBP_0026BB5C3A91.qax", "JANE-MBP_0026BB5C3A91(1).qax",
                                "JANE-MBP_0026BB5C3A91(2).qax"}) {
@@ -256,6 +291,34 @@ TEST_F(EndToEndTest, ResultFileCarriesTheSampleMacsFacts) {
   EXPECT_EQ(system_disk->annotations[1].key + "=" + system_disk->annotations[1].text, "free%=79");
   EXPECT_EQ(system_disk->annotations[2].key + "=" + system_disk->annotations[2].text, "sys=1");
   EXPECT_EQ(a.findProperty("/control", "disk:2")->annotations.size(), 2u) << "only / is sys";
+}
+
+// The guard for every later change to collection and the builders: the old
+// sample Mac must keep giving exactly this file.
+TEST_F(EndToEndTest, TheSampleMacGivesTheCommittedResult) {
+  ASSERT_EQ(run({"-silent"}).out, ">>>" + kSampleName + "\n");
+  expectSameAsCommitted(stableResultText(readResult(kSampleName)),
+                        kSource + "/tests/sample_mac/expected_result.txt");
+}
+
+// An Apple Silicon MacBook Pro on macOS 15: NVMe disk, APFS volumes, unified
+// memory, a USB stick in a Media list, an external main display.
+TEST_F(EndToEndTest, TheModernMacGivesTheCommittedResult) {
+  mac_dir_ = kSource + "/tests/modern_mac";
+  const std::string profiler_log = root_ + "/profiler.log";
+  AgentRun r = run({"-silent"}, "", "FAKE_PROFILER_LOG=" + quote(profiler_log));
+  // No NetBIOS name on today's Macs: the computer's own name leads.
+  const std::string name = hostNamePart() + "_F4D4886A1CE2.qax";
+  ASSERT_EQ(r.out, ">>>" + name + "\n");
+  expectSameAsCommitted(stableResultText(readResult(name)),
+                        kSource + "/tests/modern_mac/expected_result.txt");
+  // The newer types come once each, after the others.
+  std::string asked = readFile(profiler_log);
+  EXPECT_EQ(asked.substr(asked.find("SPPowerDataType")),
+            "SPPowerDataType\n"
+            "-detailLevel full -xml SPNVMeDataType\n"
+            "-detailLevel full -xml SPStorageDataType\n"
+            "-detailLevel full -xml SPUSBHostDataType\n");
 }
 
 TEST_F(EndToEndTest, DebugScanKeepsTheProfilersWholeOutput) {

@@ -69,5 +69,38 @@ TEST(ProcessorsSectionTest, PackageCoreAndCacheRules) {
     EXPECT_EQ(buildProcessors({{"packages", packages}}), "") << packages.textForm();
 }
 
+TEST(ProcessorsSectionTest, AppleSiliconIsOneChipWithItsCoresAndNoClockSpeed) {
+  EXPECT_EQ(buildProcessors({{"chip_type", "Apple M3 Pro"},
+                             {"number_processors", "proc 12:6:6"},
+                             {"physical_memory", "18 GB"}}),
+            R"txt(+Processors=
+*Processor:1="Apple M3 Pro"
+core-count=12
+l2-cache-size=0
+l3-cache-size=0
+-
+)txt");
+}
+
+TEST(ProcessorsSectionTest, ChipNamesAndCoreTexts) {
+  // Values: name, cores, L2 KB, L3 KB.
+  const std::pair<Keys, const char*> cases[] = {
+      {{{"chip_type", "Apple M5 Max"}, {"number_processors", "proc 18:6:0:12"}},
+       "\"Apple M5 Max\" 18 0 0 "},
+      // Apple's virtual machines count their cores as an integer.
+      {{{"chip_type", "Apple M4 Max (Virtual)"}, {"number_processors", 4}},
+       "\"Apple M4 Max (Virtual)\" 4 0 0 "},
+      {{{"cpu_type", "Intel Core i7"}, {"chip_type", "Apple M1"}}, "\"Intel Core i7\" 1 0 0 "},
+      // Only "proc" with three or four whole numbers is a core count.
+      {{{"number_processors", "proc 8:4"}}, "\"CPU #1\" 0 0 0 "},
+      {{{"number_processors", "proc 8:4:4:0:0"}}, "\"CPU #1\" 0 0 0 "},
+      {{{"number_processors", "proc 8:x:4"}}, "\"CPU #1\" 0 0 0 "},
+      {{{"number_processors", "proc 99999999999:1:1"}}, "\"CPU #1\" 0 0 0 "},
+      {{{"number_processors", "8:4:4"}}, "\"CPU #1\" 0 0 0 "},
+  };
+  for (const auto& [keys, expected] : cases)
+    EXPECT_EQ(buildProcessors(keys, true), expected) << keys.front().second.textForm();
+}
+
 }  // namespace
 }  // namespace cvn

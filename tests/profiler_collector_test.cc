@@ -147,5 +147,62 @@ TEST(CollectedDocumentTest, AWellFormedDocumentIsReadWhole) {
   EXPECT_FALSE(parseCollectedDocument("no xml here", {5, 11}, &root));
 }
 
+TEST(ExtraTypesTest, EachIsAskedOnceAndOnlyWhatPrintedSomethingIsKept) {
+  FakeCommandRunner runner;
+  std::string nvme =
+      std::string(kProfilerHeader) + typeDict("SPNVMeDataType") + std::string(kProfilerFooter);
+  runner.answer(command("SPNVMeDataType"), nvme);
+  // SPStorageDataType prints nothing, as on a profiler that does not know it.
+  runner.answer(command("SPUSBHostDataType"), "<plist");
+  std::vector<std::string> documents = ProfilerCollector(runner).collectExtraTypes();
+  EXPECT_EQ(documents, (std::vector<std::string>{nvme, "<plist"}));
+  EXPECT_EQ(runner.commands_ran_,
+            (std::vector<std::string>{command("SPNVMeDataType"), command("SPStorageDataType"),
+                                      command("SPUSBHostDataType")}));
+}
+
+TEST(ExtraTypesTest, OnlyTheAskedTypesJoinTheListAndEachOnce) {
+  auto document = [](const std::string& dicts) {
+    return std::string(kProfilerHeader) + dicts + std::string(kProfilerFooter);
+  };
+  const struct {
+    const char* what;
+    std::vector<std::string> root_types;  // empty: the main document was unreadable
+    std::vector<std::string> documents;
+    std::vector<std::string> expected;
+  } cases[] = {
+      {"appended after the main types",
+       {"SPHardwareDataType"},
+       {document(typeDict("SPNVMeDataType")), document(typeDict("SPStorageDataType"))},
+       {"SPHardwareDataType", "SPNVMeDataType", "SPStorageDataType"}},
+      {"a type nobody asked for stays out",
+       {"SPHardwareDataType"},
+       {document(typeDict("SPHardwareDataType") + typeDict("SPUSBHostDataType"))},
+       {"SPHardwareDataType", "SPUSBHostDataType"}},
+      {"a type already there is not added twice",
+       {"SPNVMeDataType"},
+       {document(typeDict("SPNVMeDataType"))},
+       {"SPNVMeDataType"}},
+      {"no XML and broken XML are passed over",
+       {"SPHardwareDataType"},
+       {"", "<plist", document("<dict><key>_dataType</key><string>SPNVMeData")},
+       {"SPHardwareDataType"}},
+      {"an unreadable main document still gets them",
+       {},
+       {document(typeDict("SPNVMeDataType"))},
+       {"SPNVMeDataType"}},
+  };
+  for (const auto& c : cases) {
+    PlistValue root;
+    if (!c.root_types.empty()) {
+      std::string main;
+      for (const std::string& type : c.root_types) main += typeDict(type);
+      ASSERT_TRUE(parsePlist(document(main), &root));
+    }
+    addExtraTypes(c.documents, &root);
+    EXPECT_EQ(dataTypes(root), c.expected) << c.what;
+  }
+}
+
 }  // namespace
 }  // namespace cvn

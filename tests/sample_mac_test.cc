@@ -13,6 +13,7 @@
 namespace {
 
 const std::string kSampleDir = std::string(CVN_SOURCE_DIR) + "/tests/sample_mac";
+const std::string kModernDir = std::string(CVN_SOURCE_DIR) + "/tests/modern_mac";
 const std::string kFakeBin = std::string(CVN_SOURCE_DIR) + "/tests/fake_bin";
 
 const char kHeader[] =
@@ -48,8 +49,8 @@ std::string runWithFakes(const std::string& command) {
 }
 
 // Checks the byte layout the collector splices on and returns the file.
-std::string readProfilerFile(const std::string& name) {
-  std::string xml = readFile(kSampleDir + "/profiler/" + name + ".xml");
+std::string readProfilerFile(const std::string& name, const std::string& dir = kSampleDir) {
+  std::string xml = readFile(dir + "/profiler/" + name + ".xml");
   EXPECT_EQ(xml.substr(0, 172), kHeader);
   EXPECT_EQ(xml.substr(xml.size() < 18 ? 0 : xml.size() - 18), kFooter);
   return xml;
@@ -66,6 +67,19 @@ TEST(SampleMacTest, ProfilerFilesKeepTheSplicedLayout) {
   }
 }
 
+TEST(SampleMacTest, TheModernMacAnswersTheNewerTypesToo) {
+  std::vector<std::string> types = kCollectedTypes;
+  for (const char* extra : {"NVMe", "Storage", "USBHost"}) types.push_back(extra);
+  std::string full = readProfilerFile("full", kModernDir);
+  for (const std::string& name : types) {
+    std::string type = "SP" + name + "DataType";
+    SCOPED_TRACE(type);
+    std::string entry = "\t\t<key>_dataType</key>\n\t\t<string>" + type + "</string>\n";
+    EXPECT_NE(readProfilerFile(type, kModernDir).find(entry), std::string::npos);
+    EXPECT_NE(full.find(entry), std::string::npos);
+  }
+}
+
 TEST(SampleMacTest, FakesPrintTheRecordingsByteForByte) {
   // An empty file name means the fake must print nothing.
   const std::vector<std::pair<std::string, std::string>> cases = {
@@ -77,6 +91,8 @@ TEST(SampleMacTest, FakesPrintTheRecordingsByteForByte) {
       {"ioreg -rd1 -c IOPlatformExpertDevice", "ioreg/IOPlatformExpertDevice.txt"},
       // Printing the USB file here would mean the fake evaluated its argument.
       {"system_profiler -detailLevel full -xml '$(echo SPUSBDataType)' 2>/dev/null", ""},
+      // The older Mac knows none of today's types.
+      {"system_profiler -detailLevel full -xml SPNVMeDataType", ""},
   };
   for (const auto& [command, file] : cases) {
     SCOPED_TRACE(command);

@@ -113,5 +113,144 @@ TEST(StorageSectionTest, SizeRoundingAndUsedShare) {
   }
 }
 
+// Today's Macs: the internal disk under NVMe with only APFS container
+// partitions, and the mounted volumes listed on their own.
+TEST(StorageSectionTest, NvmeDisksAndMountedVolumesEachOnce) {
+  TagTree raw(true, "Macintosh");
+  // An Intel Mac's second disk: an HFS+ volume the storage type lists again,
+  // and an APFS container.
+  const std::string sata = std::string(kSata) + "item0/";
+  raw.setValue(sata + "device_model", TagValue("Samsung SSD 860"));
+  raw.setValue(sata + "smart_status", TagValue("Verified"));
+  raw.setValue(sata + "size_in_bytes", TagValue(int64_t{250059350016}));
+  raw.setValue(sata + "volumes/item0/_name", TagValue("Archive"));
+  raw.setValue(sata + "volumes/item0/bsd_name", TagValue("disk1s2"));
+  raw.setValue(sata + "volumes/item0/mount_point", TagValue("/Volumes/Archive"));
+  raw.setValue(sata + "volumes/item0/size", TagValue("150 GB"));
+  raw.setValue(sata + "volumes/item0/free_space", TagValue("50 GB"));
+  raw.setValue(sata + "volumes/item1/_name", TagValue("Container"));
+  raw.setValue(sata + "volumes/item1/iocontent", TagValue("Apple_APFS"));
+  raw.setValue(sata + "volumes/item1/size", TagValue("100 GB"));
+  const std::string nvme = "/SPNVMeDataType/_items/item0/_items/item0/";
+  raw.setValue("/SPNVMeDataType/_items/item0/_name", TagValue("Apple SSD Controller"));
+  raw.setValue(nvme + "_name", TagValue("APPLE SSD AP1024Z"));
+  raw.setValue(nvme + "bsd_name", TagValue("disk0"));
+  raw.setValue(nvme + "device_model", TagValue("APPLE SSD AP1024Z"));
+  raw.setValue(nvme + "device_revision", TagValue("874.100."));
+  raw.setValue(nvme + "device_serial", TagValue("0ba0175a3c2e1f40"));
+  raw.setValue(nvme + "size", TagValue("1 TB"));
+  raw.setValue(nvme + "size_in_bytes", TagValue(int64_t{1000555581440}));
+  raw.setValue(nvme + "smart_status", TagValue("Verified"));
+  const char* containers[][3] = {{"iSCPreboot", "Apple_APFS_ISC", "524.3 MB"},
+                                 {"Macintosh HD - Data", "Apple_APFS", "994.66 GB"},
+                                 {"Recovery", "Apple_APFS_Recovery", "5.37 GB"},
+                                 {"EFI", "EFI", "209.7 MB"}};
+  for (int i = 0; i < 4; ++i) {
+    std::string volume = nvme + "volumes/item" + std::to_string(i) + "/";
+    raw.setValue(volume + "_name", TagValue(containers[i][0]));
+    raw.setValue(volume + "iocontent", TagValue(containers[i][1]));
+    raw.setValue(volume + "size", TagValue(containers[i][2]));
+  }
+  const struct {
+    const char *name, *bsd_name, *file_system, *mount_point;
+    int64_t size, free;
+    const char* protocol;
+  } mounted[] = {
+      {"Macintosh HD", "disk3s1s1", "APFS", "/", 994662584320, 512109248512, "Apple Fabric"},
+      {"Macintosh HD - Data", "disk3s5", "APFS", "/System/Volumes/Data", 994662584320, 512109248512,
+       "Apple Fabric"},
+      {"Archive", "disk1s2", "Journaled HFS+", "/Volumes/Archive", 150000000000, 50000000000,
+       "SATA"},
+      {"AnyDesk", "disk4s1", "HFS+", "/Volumes/AnyDesk", 27774976, 5406720, "Disk Image"},
+      {"USB_TM_1TB", "disk6s1", "Case-sensitive APFS", "/Volumes/USB_TM_1TB", 999995129856,
+       749995129856, "USB"},
+      {"Macintosh HD", "disk3s1s1", "APFS", "/", 994662584320, 512109248512, "Apple Fabric"},
+  };
+  for (int i = 0; i < 6; ++i) {
+    std::string volume = "/SPStorageDataType/_items/item" + std::to_string(i) + "/";
+    raw.setValue(volume + "_name", TagValue(mounted[i].name));
+    raw.setValue(volume + "bsd_name", TagValue(mounted[i].bsd_name));
+    raw.setValue(volume + "file_system", TagValue(mounted[i].file_system));
+    raw.setValue(volume + "mount_point", TagValue(mounted[i].mount_point));
+    raw.setValue(volume + "size_in_bytes", TagValue(mounted[i].size));
+    raw.setValue(volume + "free_space_in_bytes", TagValue(mounted[i].free));
+    raw.setValue(volume + "physical_drive/protocol", TagValue(mounted[i].protocol));
+  }
+  // Not mounted: nothing to record.
+  raw.setValue("/SPStorageDataType/_items/item6/_name", TagValue("Update"));
+  raw.setValue("/SPStorageDataType/_items/item6/size_in_bytes", TagValue(int64_t{1000}));
+
+  TagTree snapshot(true, "Snapshot");
+  buildStorageSection(snapshot, raw);
+  EXPECT_EQ(treeText(snapshot.top().findChild("Storage")), R"(+Storage=
++Physical-disks=
+*HDD:1=
+model="Samsung SSD 860"
+interface="SATA"
+mediatype=3
+~type=media-type
+size=250
+~base-value=250059350016
+partitions=1
+*HDD:2=
+model="APPLE SSD AP1024Z"
+interface="NVMe"
+mediatype=3
+~type=media-type
+size=1000
+~base-value=1000555581440
+serial="0ba0175a3c2e1f40"
+fw-rev="874.100."
+partitions=0
+-
++Logical-disks=
+*partition:1="Archive"
+size=161.06
+~base-value=161061273600
+free=53.69
+~base-value=53687091200
+mount-point="/Volumes/Archive"
+used%=66
+~pos=107.37
+~max=161.06
+~val-units=GB
+*partition:2="Macintosh HD"
+file-sys="APFS"
+size=994.66
+~base-value=994662584320
+free=512.11
+~base-value=512109248512
+mount-point="/"
+used%=48
+~pos=482.55
+~max=994.66
+~val-units=GB
+*partition:3="Macintosh HD - Data"
+file-sys="APFS"
+size=994.66
+~base-value=994662584320
+free=512.11
+~base-value=512109248512
+mount-point="/System/Volumes/Data"
+used%=48
+~pos=482.55
+~max=994.66
+~val-units=GB
+*partition:4="USB_TM_1TB"
+file-sys="Case-sensitive APFS"
+size=1000.00
+~base-value=999995129856
+free=750.00
+~base-value=749995129856
+mount-point="/Volumes/USB_TM_1TB"
+used%=25
+~pos=250.00
+~max=1000.00
+~val-units=GB
+-
+-
+)");
+}
+
 }  // namespace
 }  // namespace cvn

@@ -37,10 +37,34 @@ constexpr Step kSteps[] = {
     {"SPPowerDataType", nullptr},
 };
 
+// Types the older Macs do not have; a Mac without them scans as before.
+constexpr const char* kExtraTypes[] = {"SPNVMeDataType", "SPStorageDataType", "SPUSBHostDataType"};
+
+constexpr std::string_view kCommand = "system_profiler -detailLevel full -xml ";
+
+bool isExtraType(std::string_view data_type) {
+  for (std::string_view extra : kExtraTypes) {
+    if (data_type == extra) return true;
+  }
+  return false;
+}
+
+std::string_view dataTypeOf(const PlistValue& element) {
+  const PlistValue* name = element.find("_dataType");
+  return name && name->isString() ? std::string_view(name->text) : std::string_view();
+}
+
+bool holdsDataType(const PlistValue& root, std::string_view data_type) {
+  for (const PlistValue& element : root.array) {
+    if (dataTypeOf(element) == data_type) return true;
+  }
+  return false;
+}
+
 }  // namespace
 
 std::string ProfilerCollector::runProfiler(std::string_view data_type, Trim trim) {
-  std::string command = "system_profiler -detailLevel full -xml ";
+  std::string command(kCommand);
   command += data_type;
   std::string output;
   // Deliberately unbounded: every data type is waited for rather than left
@@ -95,6 +119,35 @@ std::string ProfilerCollector::collect(bool progress, std::FILE* out,
     std::fflush(out);
   }
   return document;
+}
+
+std::vector<std::string> ProfilerCollector::collectExtraTypes() {
+  std::vector<std::string> documents;
+  for (const char* data_type : kExtraTypes) {
+    // One run only: unlike the main types, a Mac that lacks these is normal,
+    // and waiting for them would never end.
+    std::string output = runner_.run(std::string(kCommand) + data_type, kProfilerChunk);
+    if (!output.empty()) documents.push_back(std::move(output));
+  }
+  return documents;
+}
+
+void addExtraTypes(const std::vector<std::string>& documents, PlistValue* root) {
+  for (const std::string& document : documents) {
+    PlistValue list;
+    if (!parsePlist(document, &list) || !list.isArray()) continue;
+    for (PlistValue& element : list.array) {
+      std::string_view data_type = dataTypeOf(element);
+      if (!element.isDictionary() || !isExtraType(data_type)) continue;
+      if (!root->isArray()) {
+        // The main document could not be read at all.
+        *root = PlistValue();
+        root->kind = PlistValue::Kind::kArray;
+      }
+      if (holdsDataType(*root, data_type)) continue;
+      root->array.push_back(std::move(element));
+    }
+  }
 }
 
 bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,

@@ -32,6 +32,13 @@ class ProfilerCollector {
   /// for the cut. A tool that prints nothing is asked again until it does.
   std::string runProfiler(std::string_view data_type, Trim trim);
 
+  /// The data types where today's Macs keep their NVMe disks, mounted APFS
+  /// volumes and (from macOS 26) USB tree, each run once after the others
+  /// and kept as a whole document of its own, so that the spliced document
+  /// stays as it was. Prints nothing; a type the profiler does not know
+  /// gives no document.
+  std::vector<std::string> collectExtraTypes();
+
  private:
   CommandRunner& runner_;
 };
@@ -46,6 +53,12 @@ struct PlistValue;
 /// problem.
 bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
                             PlistValue* out, std::string* warning = nullptr);
+
+/// Appends to the profiler list `root` the data type dictionaries of the
+/// documents of collectExtraTypes, each only when it is one of the types
+/// asked for there and `root` does not hold that type yet. Unreadable documents
+/// are passed over.
+void addExtraTypes(const std::vector<std::string>& documents, PlistValue* root);
 
 }  // namespace cvn
 

@@ -3,8 +3,10 @@
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
+#include <optional>
 
 #include "collect/command_runner.h"
+#include "collect/processor_text.h"
 #include "zxml/size_text.h"
 
 namespace cvn {
@@ -35,6 +37,16 @@ std::string oneDecimal(double value) {
   return buf;
 }
 
+// Where the older key is missing, today's profilers give the resolution
+// under another key, or only the panel's pixels.
+std::string displayResolution(const PlistValue& display) {
+  for (const char* key :
+       {"spdisplays_resolution", "_spdisplays_resolution", "_spdisplays_pixels"}) {
+    if (display.find(key)) return display.textAt(key);
+  }
+  return std::string();
+}
+
 void readDisplays(const PlistValue& root, QuickFacts* facts) {
   const PlistValue* items = findProfilerItems(root, "SPDisplaysDataType");
   if (!items) return;
@@ -52,7 +64,7 @@ void readDisplays(const PlistValue& root, QuickFacts* facts) {
     if (!displays) continue;
     for (const PlistValue& display : displays->array) {
       if (display.textAt("spdisplays_main") != "spdisplays_yes") continue;
-      facts->main_display_resolution = display.textAt("spdisplays_resolution");
+      facts->main_display_resolution = displayResolution(display);
       facts->main_display_edid = display.textAt("_spdisplays_edid");
       return;
     }
@@ -60,24 +72,32 @@ void readDisplays(const PlistValue& root, QuickFacts* facts) {
 }
 
 void readDisks(const PlistValue& root, QuickFacts* facts) {
-  const PlistValue* controllers = findProfilerItems(root, "SPSerialATADataType");
-  if (!controllers) return;
   double disks = 0, volumes = 0, free = 0;
   bool any_disk = false, any_volume = false;
-  for (const PlistValue& controller : controllers->array) {
-    const PlistValue* devices = controller.findArray("_items");
-    if (!devices) continue;
-    for (const PlistValue& device : devices->array) {
-      std::string size = device.textAt("size");
-      if (size.empty()) continue;
-      disks += SizeText::toGigabytes(size);
-      any_disk = true;
-      const PlistValue* vols = device.findArray("volumes");
-      if (!vols) continue;
-      for (const PlistValue& volume : vols->array) {
-        volumes += SizeText::toGigabytes(volume.textAt("size"));
-        free += SizeText::toGigabytes(volume.textAt("free_space"));
-        any_volume = true;
+  // NVMe disks are listed like SATA ones; their volumes are APFS containers
+  // without free space, which say nothing about the volumes in them.
+  const struct {
+    const char* data_type;
+    bool with_volumes;
+  } kDiskTypes[] = {{"SPSerialATADataType", true}, {"SPNVMeDataType", false}};
+  for (const auto& [data_type, with_volumes] : kDiskTypes) {
+    const PlistValue* controllers = findProfilerItems(root, data_type);
+    if (!controllers) continue;
+    for (const PlistValue& controller : controllers->array) {
+      const PlistValue* devices = controller.findArray("_items");
+      if (!devices) continue;
+      for (const PlistValue& device : devices->array) {
+        std::string size = device.textAt("size");
+        if (size.empty()) continue;
+        disks += SizeText::toGigabytes(size);
+        any_disk = true;
+        const PlistValue* vols = with_volumes ? device.findArray("volumes") : nullptr;
+        if (!vols) continue;
+        for (const PlistValue& volume : vols->array) {
+          volumes += SizeText::toGigabytes(volume.textAt("size"));
+          free += SizeText::toGigabytes(volume.textAt("free_space"));
+          any_volume = true;
+        }
       }
     }
   }
@@ -108,18 +128,28 @@ QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
   const PlistValue* packages = hardware.find("packages");
   if (packages && packages->kind == PlistValue::Kind::kInteger) {
     facts.package_count = std::to_string(static_cast<unsigned>(packages->integer));
+  } else if (!packages && hardware.find("chip_type")) {
+    // One chip, as the Processors section records it.
+    facts.package_count = "1";
   }
   facts.processor_count = hardware.numberTextAt("number_processors");
+  // Apple Silicon counts its cores in a text, "proc 12:6:6".
+  if (std::optional<int64_t> cores = coreCountOfProcText(hardware.textAt("number_processors")))
+    facts.processor_count = std::to_string(*cores);
   std::string speed = hardware.textAt("current_processor_speed");
   if (!speed.empty()) {
-    double number = std::atof(firstWord(speed).c_str());
+    std::string first = firstWord(speed);
+    // The profiler follows the locale: "2,3 GHz" has a decimal comma.
+    for (char& c : first)
+      if (c == ',') c = '.';
+    double number = std::atof(first.c_str());
     // Old profilers print "2.26 GHz", very old ones "867 MHz".
     facts.processor_speed =
         wholeNumber(speed.find("MHz") != std::string::npos ? number : number * 1000);
   }
-  facts.processor_model = hardware.textAt("cpu_type");
-  if (facts.processor_model.find("Intel") != std::string::npos)
-    facts.processor_maker = "GenuineIntel";
+  facts.processor_model =
+      hardware.find("cpu_type") ? hardware.textAt("cpu_type") : hardware.textAt("chip_type");
+  facts.processor_maker = processorMakerOf(facts.processor_model);
   facts.machine_model = hardware.textAt("machine_model");
   facts.system_maker = "Apple Inc.";
   std::string memory = hardware.textAt("physical_memory");

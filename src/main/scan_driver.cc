@@ -64,10 +64,12 @@ void ScanDriver::run(const OutputSettings& output, const ScanOptions& options) {
   log(logging, "------Start Log------\n");
   log(logging, "I. Collecting Data....\n");
   std::vector<size_t> part_ends;
-  std::string document =
-      ProfilerCollector(tools_.sources.runner).collect(logging, tools_.out, &part_ends);
+  ProfilerCollector collector(tools_.sources.runner);
+  std::string document = collector.collect(logging, tools_.out, &part_ends);
+  std::vector<std::string> extra_documents = collector.collectExtraTypes();
   log(logging, "done\n");
-  result = runScanPipeline(std::move(document), part_ends, request, tools_.sources);
+  result = runScanPipeline(std::move(document), part_ends, request, tools_.sources,
+                           std::move(extra_documents));
   // The trees are done with once the image exists.
   result.snapshot.reset();
   result.asset_info.reset();

@@ -54,14 +54,17 @@ void writeSnapshotHeader(TagTree& snapshot, const std::string& date, int64_t sca
 }  // namespace
 
 ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part_ends,
-                           const ScanRequest& request, const ScanSources& sources) {
+                           const ScanRequest& request, const ScanSources& sources,
+                           std::vector<std::string> extra_documents) {
   ScanResult result;
   std::string ip = request.ip;
   // A document that cannot be read leaves the trees without profiler data;
   // the scan still writes its file.
   PlistValue plist;
   parseCollectedDocument(document, part_ends, &plist, &result.parse_warning);
+  addExtraTypes(extra_documents, &plist);
   document = std::string();
+  extra_documents.clear();
 
   QuickFacts facts = readQuickFacts(plist, sources.runner);
   // Read before the conversion, which takes the list apart so that the list

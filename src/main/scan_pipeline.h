@@ -58,8 +58,11 @@ struct ScanResult {
 
 /// A normal scan of the spliced profiler document. `part_ends` (from the
 /// collector) lets a broken data type cost only itself; it may be empty.
+/// `extra_documents` are the collector's documents of the data types asked
+/// for after the spliced ones; their data types join the list.
 ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part_ends,
-                           const ScanRequest& request, const ScanSources& sources);
+                           const ScanRequest& request, const ScanSources& sources,
+                           std::vector<std::string> extra_documents = {});
 
 /// The debug scan: the profiler's whole output stored unparsed beside a
 /// minimal asset tree.

@@ -43,6 +43,10 @@ std::string rawText(const Tag& item, std::string_view key) {
 
 bool hasKey(const Tag& item, std::string_view key) { return item.findProperty(key) != nullptr; }
 
+bool isUnifiedMemory(const Tag& item) {
+  return hasKey(item, "SPMemoryDataType") && !item.findChild("_items");
+}
+
 void copyField(Tag& record, std::string_view field, const Tag& item, std::string_view key) {
   const TagValue* v = rawValue(item, key);
   record.setProperty(field, v ? *v : TagValue());

@@ -22,6 +22,10 @@ const Tag* findFirstItem(const TagTree& raw, std::string_view data_type);
 /// the converter stores nothing for leave no tag, so names can have gaps.
 size_t itemPosition(const Tag& item, size_t index);
 
+/// Apple Silicon's memory item: soldered memory beside the chip, its size
+/// under the data type's own name ("SPMemoryDataType" "16 GB"), no slots.
+bool isUnifiedMemory(const Tag& item);
+
 /// The raw key's value, or null when the key is missing.
 const TagValue* rawValue(const Tag& item, std::string_view key);
 /// The raw key's text: its value when that is text, else empty.

@@ -75,9 +75,19 @@ void writeEdidFields(Tag& monitor, const EdidInfo& edid) {
   }
 }
 
+// Today's profilers moved the resolution to "_spdisplays_resolution"
+// ("1800 x 1125 @ 120.00Hz"); some give only the panel's pixels.
+const char* resolutionKey(const Tag& display) {
+  for (const char* key :
+       {"spdisplays_resolution", "_spdisplays_resolution", "_spdisplays_pixels"}) {
+    if (hasKey(display, key)) return key;
+  }
+  return "spdisplays_resolution";
+}
+
 void writeMonitor(Tag& monitor, const Tag& display) {
   copyField(monitor, "name", display, "_name");
-  copyField(monitor, "resolution", display, "spdisplays_resolution");
+  copyField(monitor, "resolution", display, resolutionKey(display));
   monitor.setProperty("main-display",
                       TagValue(flagText(rawText(display, "spdisplays_main"), "spdisplays_yes")));
   EdidInfo edid;

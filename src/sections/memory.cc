@@ -25,6 +25,16 @@ void addSlot(Tag& memory, const Tag& slot, bool nested, int& counter) {
   copyField(record, "bank-label", slot, "_name");
 }
 
+// Soldered memory has no slot, speed or bank; the record says how much there
+// is, of which type and by whom.
+void addUnifiedMemory(Tag& memory, const Tag& item, int& counter) {
+  Tag& record = memory.addChild(formatText("Memory-slot:%d", counter++));
+  record.setProperty("used", TagValue("1"));
+  copyFieldIfPresent(record, "manuf", item, "dimm_manufacturer");
+  record.setProperty("capacity", TagValue(sizeInMegabytes(rawText(item, "SPMemoryDataType"))));
+  copyFieldIfPresent(record, "mem-type", item, "dimm_type");
+}
+
 }  // namespace
 
 void buildMemorySection(TagTree& snapshot, const TagTree& raw) {
@@ -36,6 +46,8 @@ void buildMemorySection(TagTree& snapshot, const TagTree& raw) {
     for (const auto& item : items->children()) {
       if (const Tag* group = item->findChild("_items")) {
         for (const auto& slot : group->children()) addSlot(memory, *slot, true, counter);
+      } else if (isUnifiedMemory(*item)) {
+        addUnifiedMemory(memory, *item, counter);
       } else {
         addSlot(memory, *item, false, counter);
       }

@@ -2,8 +2,10 @@
 // machine-wide figures of the hardware overview spread over the packages.
 #include <cmath>
 #include <cstdlib>
+#include <optional>
 #include <string>
 
+#include "collect/processor_text.h"
 #include "sections/builder_util.h"
 #include "sections/sections.h"
 #include "zxml/size_text.h"
@@ -19,7 +21,11 @@ int64_t readCoreCount(const Tag& item) {
   const TagValue* count = rawValue(item, "number_processors");
   if (!count) count = rawValue(item, "number_cpus");
   if (!count) return 1;
-  return count->isInt() ? count->asInt() : 0;
+  if (count->isInt()) return count->asInt();
+  // Apple Silicon counts its cores in a text, "proc 8:4:4".
+  std::optional<int64_t> cores =
+      count->isText() ? coreCountOfProcText(count->text()) : std::nullopt;
+  return cores.value_or(0);
 }
 
 // KB per package from the whole-machine form, else from the per-core forms
@@ -71,6 +77,8 @@ void buildProcessorsSection(TagTree& snapshot, const TagTree& raw) {
   bool has_speed = speed && speed->isText();
   int64_t megahertz = has_speed ? speedInMegahertz(speed->text()) : 0;
   const TagValue* cpu_type = rawValue(*item, "cpu_type");
+  // Apple Silicon names its chip instead ("Apple M1 Pro").
+  if (!cpu_type) cpu_type = rawValue(*item, "chip_type");
 
   for (int64_t p = 1; p <= packages; ++p) {
     Tag& processors = snapshot.top().addChild("Processors");

@@ -1,5 +1,7 @@
-// "Storage": the disks and drives of the serial ATA, parallel SCSI and
-// parallel ATA buses, and the volumes of each disk.
+// "Storage": the disks and drives of the serial ATA, NVMe, parallel SCSI and
+// parallel ATA buses, the volumes of each disk, and the mounted volumes that
+// today's profilers list on their own.
+#include <set>
 #include <string>
 
 #include "sections/builder_util.h"
@@ -10,7 +12,28 @@
 namespace cvn {
 namespace {
 
-enum class DiskBus { kSerialAta, kParallelScsi };
+enum class DiskBus { kSerialAta, kNvme, kParallelScsi };
+
+bool hasFreeSpace(const Tag& volume) {
+  return hasKey(volume, "free_space") || hasKey(volume, "free_space_in_bytes");
+}
+
+// APFS keeps its volumes inside container partitions, which the disk types
+// list with a size but never mounted; the volumes themselves come from
+// SPStorageDataType. A SATA disk is only judged so by its APFS content, so
+// the partitions of older systems count as they always did; an NVMe disk is
+// too new to have any other kind of unmounted partition worth a record.
+bool isUnmountedContainer(const Tag& volume, DiskBus bus) {
+  if (!rawText(volume, "mount_point").empty() || hasFreeSpace(volume)) return false;
+  if (bus == DiskBus::kNvme) return true;
+  return rawText(volume, "iocontent").compare(0, 10, "Apple_APFS") == 0;
+}
+
+// A mounted installer or download is no disk of the machine.
+bool isDiskImage(const Tag& volume) {
+  const Tag* drive = volume.findChild("physical_drive");
+  return drive && rawText(*drive, "protocol") == "Disk Image";
+}
 
 // The three numberings run across all data types, so a SCSI disk found after
 // two SATA disks is the third disk.
@@ -26,8 +49,8 @@ class StorageWriter {
   void addDisk(const Tag& device, DiskBus bus) {
     Tag& disk = physicalDisks().addChild(formatText("HDD:%d", ++disks_));
     copyFieldIfPresent(disk, "model", device, "device_model");
-    if (bus == DiskBus::kSerialAta) {
-      disk.setProperty("interface", TagValue("SATA"));
+    if (bus != DiskBus::kParallelScsi) {
+      disk.setProperty("interface", TagValue(bus == DiskBus::kNvme ? "NVMe" : "SATA"));
       disk.setProperty("mediatype", TagValue(int64_t{3}), "type", "media-type");
     } else {
       // The console has always received the SCSI media type as text.
@@ -40,10 +63,25 @@ class StorageWriter {
     int64_t partitions = 0;
     if (const Tag* volumes = device.findChild("volumes")) {
       for (const auto& volume : volumes->children()) {
-        if (addVolume(*volume)) ++partitions;
+        if (!isUnmountedContainer(*volume, bus) && addVolume(*volume)) ++partitions;
       }
     }
     disk.setProperty("partitions", TagValue(partitions));
+  }
+
+  // A volume of SPStorageDataType, unless a disk already gave it.
+  void addMountedVolume(const Tag& volume) {
+    if (!hasKey(volume, "_name") || isDiskImage(volume)) return;
+    std::string mount_point = rawText(volume, "mount_point");
+    if (mount_point.empty() && !hasFreeSpace(volume)) return;
+    if (wasRecorded(volume)) return;
+    remember(volume);
+    Tag& partition = logicalDisks().setChildValue(formatText("partition:%d", ++volumes_),
+                                                  TagValue(rawText(volume, "_name")));
+    writeFileSystem(partition, volume);
+    VolumeSpace space = writeMountedVolumeSpace(partition, volume);
+    copyFieldIfPresent(partition, "mount-point", volume, "mount_point");
+    writeUsedPercent(partition, space);
   }
 
  private:
@@ -68,8 +106,25 @@ class StorageWriter {
     disk.setProperty("size", TagValue(truncateToInt64(gigabytes)), "base-value", base.c_str());
   }
 
+  // The same volume can be listed by its disk and again among the mounted
+  // volumes; its device name or mount point tells.
+  bool wasRecorded(const Tag& volume) const {
+    std::string bsd_name = rawText(volume, "bsd_name");
+    std::string mount_point = rawText(volume, "mount_point");
+    return (!bsd_name.empty() && bsd_names_.count(bsd_name)) ||
+           (!mount_point.empty() && mount_points_.count(mount_point));
+  }
+
+  void remember(const Tag& volume) {
+    std::string bsd_name = rawText(volume, "bsd_name");
+    std::string mount_point = rawText(volume, "mount_point");
+    if (!bsd_name.empty()) bsd_names_.insert(bsd_name);
+    if (!mount_point.empty()) mount_points_.insert(mount_point);
+  }
+
   bool addVolume(const Tag& volume) {
     if (!hasKey(volume, "_name")) return false;
+    remember(volume);
     Tag& partition = logicalDisks().setChildValue(formatText("partition:%d", ++volumes_),
                                                   TagValue(rawText(volume, "_name")));
     if (rawText(volume, "iocontent") == "Apple_CoreStorage") {
@@ -86,60 +141,71 @@ class StorageWriter {
   int disks_ = 0;
   int drives_ = 0;
   int volumes_ = 0;
+  std::set<std::string> bsd_names_;
+  std::set<std::string> mount_points_;
 };
 
 const Tag* childItems(const Tag& tag) { return tag.findChild("_items"); }
 
-void addSerialAta(StorageWriter& writer, const TagTree& raw) {
-  const Tag* controllers = findItems(raw, "SPSerialATADataType");
-  if (!controllers) return;
-  for (const auto& controller : controllers->children()) {
-    const Tag* devices = childItems(*controller);
-    if (!devices) continue;
-    for (const auto& device : devices->children()) {
-      const TagValue* smart = rawValue(*device, "smart_status");
-      // Optical drives report no SMART status, or "Not Supported".
-      if (!smart || (smart->isText() && smart->text() == "Not Supported")) {
-        writer.addDrive(*device);
-      } else {
-        writer.addDisk(*device, DiskBus::kSerialAta);
-      }
+// Each entry of the "_items" list of each entry of `parents`: the disks of
+// controllers and buses.
+template <typename Visit>
+void forEachItemBelow(const Tag& parents, Visit visit) {
+  for (const auto& parent : parents.children()) {
+    if (const Tag* items = childItems(*parent)) {
+      for (const auto& item : items->children()) visit(*item);
     }
   }
+}
+
+// SATA and NVMe list their disks alike, under controllers.
+void addControllerDisks(StorageWriter& writer, const TagTree& raw, DiskBus bus) {
+  const Tag* controllers =
+      findItems(raw, bus == DiskBus::kNvme ? "SPNVMeDataType" : "SPSerialATADataType");
+  if (!controllers) return;
+  forEachItemBelow(*controllers, [&](const Tag& device) {
+    const TagValue* smart = rawValue(device, "smart_status");
+    // Optical drives report no SMART status, or "Not Supported".
+    if (!smart || (smart->isText() && smart->text() == "Not Supported")) {
+      writer.addDrive(device);
+    } else {
+      writer.addDisk(device, bus);
+    }
+  });
 }
 
 void addParallelScsi(StorageWriter& writer, const TagTree& raw) {
   const Tag* cards = findItems(raw, "SPParallelSCSIDataType");
   if (!cards) return;
-  for (const auto& card : cards->children()) {
-    const Tag* buses = childItems(*card);
-    if (!buses) continue;
-    for (const auto& bus : buses->children()) {
-      const Tag* devices = childItems(*bus);
-      if (!devices) continue;
+  forEachItemBelow(*cards, [&](const Tag& bus) {
+    if (const Tag* devices = childItems(bus)) {
       for (const auto& device : devices->children())
         writer.addDisk(*device, DiskBus::kParallelScsi);
     }
-  }
+  });
+}
+
+void addMountedVolumes(StorageWriter& writer, const TagTree& raw) {
+  const Tag* volumes = findItems(raw, "SPStorageDataType");
+  if (!volumes) return;
+  for (const auto& volume : volumes->children()) writer.addMountedVolume(*volume);
 }
 
 void addParallelAta(StorageWriter& writer, const TagTree& raw) {
   const Tag* buses = findItems(raw, "SPParallelATADataType");
   if (!buses) return;
-  for (const auto& bus : buses->children()) {
-    const Tag* devices = childItems(*bus);
-    if (!devices) continue;
-    for (const auto& device : devices->children()) writer.addDrive(*device);
-  }
+  forEachItemBelow(*buses, [&](const Tag& device) { writer.addDrive(device); });
 }
 
 }  // namespace
 
 void buildStorageSection(TagTree& snapshot, const TagTree& raw) {
   StorageWriter writer(snapshot.top());
-  addSerialAta(writer, raw);
+  addControllerDisks(writer, raw, DiskBus::kSerialAta);
+  addControllerDisks(writer, raw, DiskBus::kNvme);
   addParallelScsi(writer, raw);
   addParallelAta(writer, raw);
+  addMountedVolumes(writer, raw);
 }
 
 }  // namespace cvn

@@ -69,7 +69,8 @@ void addMemorySlots(Tag& top, const TagTree& raw) {
       const auto& banks = group->children();
       for (size_t j = 0; j < banks.size(); ++j)
         addMemorySlot(top, *banks[j], itemPosition(*banks[j], j) + 1);
-    } else {
+    } else if (!isUnifiedMemory(entry)) {
+      // Soldered memory has no slot to record.
       addMemorySlot(top, entry, itemPosition(entry, i) + 1);
     }
   }

@@ -1,6 +1,10 @@
 // USB devices: removable storage joins the disks under "Storage" (asking
 // diskutil for its media name), every other device goes under
-// "Peripherals"/"USB". Hubs are walked through, not recorded.
+// "Peripherals"/"USB". Hubs are walked through, not recorded. From macOS 26
+// the devices are only in the USB host data type, which has its own keys.
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -25,6 +29,31 @@ constexpr std::string_view kDescriptorKeys[] = {"product_id", "vendor_id",     "
                                                 "serial_num", "device_speed",  "manufacturer",
                                                 "bus_power",  "bus_power_used"};
 
+// Raw keys and the fields (or texts) they give.
+struct KeyText {
+  std::string_view key;
+  const char* text;
+};
+
+constexpr KeyText kDeviceFields[] = {
+    {"product_id", "product-id"},        {"vendor_id", "vendor-id"}, {"bcd_device", "bcd-device"},
+    {"serial_num", "serial-number"},     {"manufacturer", "manuf"},  {"bus_power", "bus-power"},
+    {"bus_power_used", "bus-power-used"}};
+constexpr KeyText kHostDeviceFields[] = {{"USBDeviceKeyProductID", "product-id"},
+                                         {"USBDeviceKeyVendorID", "vendor-id"},
+                                         {"USBDeviceKeyProductVersion", "bcd-device"},
+                                         {"USBDeviceKeySerialNumber", "serial-number"},
+                                         {"USBDeviceKeyVendorName", "manuf"}};
+constexpr KeyText kSpeedMegabits[] = {
+    {"full_speed", "12"}, {"low_speed", "1.5"}, {"high_speed", "480"}};
+
+template <size_t N>
+const char* fieldFor(const KeyText (&table)[N], std::string_view key) {
+  for (const KeyText& entry : table)
+    if (entry.key == key) return entry.text;
+  return nullptr;
+}
+
 // The profilers of 10.5 and 10.6 sort the USB descriptor keys by a letter
 // prefix ("a_product_id", "h_bus_power"); behind it is the key that later
 // profilers write plainly.
@@ -48,6 +77,30 @@ std::optional<std::string> findMediaName(const std::string& diskutil_output) {
   return trimText(std::string_view(diskutil_output).substr(start, end - start), " \n\r", kTrimBoth);
 }
 
+// The megabits per second of a link speed text of the USB host type ("12
+// Mb/s", "5 Gb/s", "USB 2.0 (480 Mb/s)"): the first number followed by a
+// rate unit, as text. Nothing for a form that says no rate.
+std::optional<std::string> linkSpeedMegabits(std::string_view text) {
+  constexpr std::string_view kDigits = "0123456789";
+  for (size_t start = text.find_first_of(kDigits); start != std::string_view::npos;) {
+    size_t end = std::min(text.find_first_not_of("0123456789.,", start), text.size());
+    std::string number(text.substr(start, end - start));
+    for (char& c : number)
+      if (c == ',') c = '.';
+    std::string_view unit = text.substr(end);
+    unit.remove_prefix(std::min(unit.find_first_not_of(' '), unit.size()));
+    double rate = std::strtod(number.c_str(), nullptr);
+    if (unit.substr(0, 2) == "Gb") rate *= 1000;
+    if ((unit.substr(0, 2) == "Gb" || unit.substr(0, 2) == "Mb") && rate > 0 && rate < 1e9) {
+      char buffer[32];
+      std::snprintf(buffer, sizeof buffer, "%.10g", rate);
+      return std::string(buffer);
+    }
+    start = text.find_first_of(kDigits, end);
+  }
+  return std::nullopt;
+}
+
 class UsbWriter {
  public:
   UsbWriter(Tag& top, CommandRunner& runner) : top_(top), runner_(runner) {}
@@ -55,7 +108,12 @@ class UsbWriter {
   void addDevice(const Tag& device, int depth = 0) {
     const TagValue* removable = rawValue(device, "removable_media");
     if (removable && removable->isText() && removable->text() == "yes") {
-      addRemovable(device);
+      addRemovable(device, device);
+      return;
+    }
+    // Today's profilers keep a storage device's disks in a "Media" list.
+    if (const Tag* media = device.findChild("Media"); media && !media->children().empty()) {
+      for (const auto& medium : media->children()) addRemovable(device, *medium);
       return;
     }
     if (const Tag* children = device.findChild("_items")) {
@@ -67,49 +125,71 @@ class UsbWriter {
     addPeripheral(device);
   }
 
- private:
-  void addPeripheral(const Tag& device) {
-    Tag& record = top_.addChild("Peripherals")
-                      .addChild("USB")
-                      .addChild(formatText("Device:%d", devices_ + 1));
-    if (const TagValue* name = rawValue(device, "_name")) record.setValue(*name);
+  /// A device of the USB host type; hubs are walked through.
+  void addHostDevice(const Tag& device, int depth = 0) {
+    if (const Tag* children = device.findChild("_items")) {
+      if (depth < kMaxHubDepth) {
+        for (const auto& child : children->children()) addHostDevice(*child, depth + 1);
+      }
+      return;
+    }
+    Tag& record = addDeviceRecord(device);
     for (const auto& prop : device.properties()) {
-      std::string_view key = descriptorKey(prop->name());
-      const TagValue& value = prop->value();
-      if (key == "product_id") {
-        record.setProperty("product-id", value);
-      } else if (key == "vendor_id") {
-        record.setProperty("vendor-id", value);
-      } else if (key == "bcd_device") {
-        record.setProperty("bcd-device", value);
-      } else if (key == "serial_num") {
-        record.setProperty("serial-number", value);
-      } else if (key == "device_speed") {
-        // Megabits per second; speeds without a known rate are left out.
-        const std::string& speed = value.text();
-        if (speed == "full_speed") {
-          record.setProperty("device-speed", TagValue("12"));
-        } else if (speed == "low_speed") {
-          record.setProperty("device-speed", TagValue("1.5"));
-        } else if (speed == "high_speed") {
-          record.setProperty("device-speed", TagValue("480"));
-        }
-      } else if (key == "manufacturer") {
-        record.setProperty("manuf", value);
-      } else if (key == "bus_power") {
-        record.setProperty("bus-power", value);
-      } else if (key == "bus_power_used") {
-        record.setProperty("bus-power-used", value);
+      std::string_view key = prop->name();
+      if (key == "USBDeviceKeyLinkSpeed") {
+        if (std::optional<std::string> speed = linkSpeedMegabits(prop->value().text()))
+          record.setProperty("device-speed", TagValue(*speed));
+      } else if (const char* field = fieldFor(kHostDeviceFields, key)) {
+        record.setProperty(field, prop->value());
       }
     }
-    ++devices_;
   }
 
-  void addRemovable(const Tag& device) {
+ private:
+  void addPeripheral(const Tag& device) {
+    Tag& record = addDeviceRecord(device);
+    for (const auto& prop : device.properties()) {
+      std::string_view key = descriptorKey(prop->name());
+      if (key == "device_speed") {
+        // Megabits per second; speeds without a known rate are left out.
+        if (const char* rate = fieldFor(kSpeedMegabits, prop->value().text()))
+          record.setProperty("device-speed", TagValue(rate));
+      } else if (const char* field = fieldFor(kDeviceFields, key)) {
+        record.setProperty(field, prop->value());
+      }
+    }
+  }
+
+  Tag& addDeviceRecord(const Tag& device) {
+    ++devices_;
+    Tag& record =
+        top_.addChild("Peripherals").addChild("USB").addChild(formatText("Device:%d", devices_));
+    if (const TagValue* name = rawValue(device, "_name")) record.setValue(*name);
+    return record;
+  }
+
+  // `medium` holds the size, the disk's name and the volumes: the device
+  // itself on older profilers, an entry of its "Media" list on today's.
+  void addRemovable(const Tag& device, const Tag& medium) {
     Tag& physical = top_.addChild("Storage").addChild("Physical-disks");
     Tag& disk = physical.addChild(physical.nextNumberedName("Removable:"));
     if (const TagValue* name = rawValue(device, "_name")) disk.setValue(*name);
     disk.setProperty("media-type", TagValue("2"));
+    writeRemovableKeys(disk, device, false);
+    if (&medium != &device) writeRemovableKeys(disk, medium, true);
+    disk.setProperty("interface", TagValue("USB"));
+    int64_t partitions = 0;
+    if (const Tag* volumes = medium.findChild("volumes")) {
+      for (const auto& volume : volumes->children()) {
+        if (addVolume(*volume)) ++partitions;
+      }
+    }
+    disk.setProperty("partitions", TagValue(partitions));
+  }
+
+  // `in_media_list`: the keys of a "Media" entry, whose size texts are
+  // decimal, so its byte count is the better source.
+  void writeRemovableKeys(Tag& disk, const Tag& device, bool in_media_list) {
     for (const auto& prop : device.properties()) {
       std::string_view key = descriptorKey(prop->name());
       const TagValue& value = prop->value();
@@ -128,23 +208,23 @@ class UsbWriter {
       } else if (key == "bus_power_used") {
         disk.setProperty("bus-power-used", value);
       } else if (key == "size") {
-        writeRemovableSize(disk, device, value);
+        writeRemovableSize(disk, device, value, in_media_list);
       } else if (key == "bsd_name") {
         writeMediaName(disk, value.text());
       }
     }
-    disk.setProperty("interface", TagValue("USB"));
-    int64_t partitions = 0;
-    if (const Tag* volumes = device.findChild("volumes")) {
-      for (const auto& volume : volumes->children()) {
-        if (addVolume(*volume)) ++partitions;
-      }
-    }
-    disk.setProperty("partitions", TagValue(partitions));
   }
 
-  static void writeRemovableSize(Tag& disk, const Tag& device, const TagValue& size) {
+  static void writeRemovableSize(Tag& disk, const Tag& device, const TagValue& size,
+                                 bool in_media_list) {
     double gigabytes = SizeText::toDecimalGigabytes(size.text(), true);
+    const TagValue* count = rawValue(device, "size_in_bytes");
+    if (in_media_list && count && count->isInt()) {
+      // Rounded as the text is: a fraction above .4 counts up.
+      double exact = bytesToDecimalGigabytes(count->asInt());
+      gigabytes = static_cast<double>(truncateToInt64(exact));
+      if (exact - gigabytes > 0.4) gigabytes += 1.0;
+    }
     TagValue whole(truncateToInt64(gigabytes));
     if (const TagValue* bytes = rawValue(device, "size_in_bytes")) {
       std::string base = formatText("%lld", static_cast<long long>(rawBytes(*bytes)));
@@ -165,9 +245,12 @@ class UsbWriter {
   }
 
   // Volumes the profiler lists without free space (not mounted) are left out.
+  // One that the mounted volumes of the disk section already hold is counted
+  // but not written again.
   bool addVolume(const Tag& volume) {
     if (!hasKey(volume, "_name") || !hasKey(volume, "free_space")) return false;
     Tag& logical = top_.addChild("Storage").addChild("Logical-disks");
+    if (isMountedAlready(logical, rawText(volume, "mount_point"))) return true;
     Tag& partition = logical.setChildValue(logical.nextNumberedName("partition:"),
                                            TagValue(rawText(volume, "_name")));
     writeFileSystem(partition, volume);
@@ -178,6 +261,15 @@ class UsbWriter {
     return true;
   }
 
+  static bool isMountedAlready(const Tag& logical, const std::string& mount_point) {
+    if (mount_point.empty()) return false;
+    for (const auto& partition : logical.children()) {
+      const TagProperty* known = partition->findProperty("mount-point");
+      if (known && known->value().isText() && known->value().text() == mount_point) return true;
+    }
+    return false;
+  }
+
   Tag& top_;
   CommandRunner& runner_;
   int devices_ = 0;
@@ -186,13 +278,26 @@ class UsbWriter {
 }  // namespace
 
 void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner) {
-  const Tag* buses = findItems(raw, "SPUSBDataType");
-  if (!buses) return;
   UsbWriter writer(snapshot.top(), runner);
-  for (const auto& bus : buses->children()) {
+  bool any_device = false;
+  if (const Tag* buses = findItems(raw, "SPUSBDataType")) {
+    for (const auto& bus : buses->children()) {
+      const Tag* devices = bus->findChild("_items");
+      if (!devices) continue;
+      for (const auto& device : devices->children()) {
+        writer.addDevice(*device);
+        any_device = true;
+      }
+    }
+  }
+  // macOS 26 and later leave the older type empty.
+  if (any_device) return;
+  const Tag* host_buses = findItems(raw, "SPUSBHostDataType");
+  if (!host_buses) return;
+  for (const auto& bus : host_buses->children()) {
     const Tag* devices = bus->findChild("_items");
     if (!devices) continue;
-    for (const auto& device : devices->children()) writer.addDevice(*device);
+    for (const auto& device : devices->children()) writer.addHostDevice(*device);
   }
 }
 

@@ -50,20 +50,37 @@ void writeFileSystem(Tag& partition, const Tag& volume) {
   }
 }
 
-VolumeSpace writeVolumeSpace(Tag& partition, const Tag& volume) {
+namespace {
+
+// The old layout writes a size only beside its text; today's mounted volumes
+// may carry the byte count alone.
+VolumeSpace writeSpace(Tag& partition, const Tag& volume, bool bytes_alone_count) {
   VolumeSpace space;
-  if (hasKey(volume, "size")) {
+  auto present = [&](const char* bytes_key, const char* text_key) {
+    return hasKey(volume, text_key) || (bytes_alone_count && hasKey(volume, bytes_key));
+  };
+  if (present("size_in_bytes", "size")) {
     SizeReading total = readVolumeSize(volume, "size_in_bytes", "size");
     space.total_gb = total.gigabytes;
     writeSize(partition, "size", total);
   }
-  if (hasKey(volume, "free_space")) {
+  if (present("free_space_in_bytes", "free_space")) {
     SizeReading free = readVolumeSize(volume, "free_space_in_bytes", "free_space");
     space.free_known = true;
     space.free_gb = free.gigabytes;
     writeSize(partition, "free", free);
   }
   return space;
+}
+
+}  // namespace
+
+VolumeSpace writeVolumeSpace(Tag& partition, const Tag& volume) {
+  return writeSpace(partition, volume, false);
+}
+
+VolumeSpace writeMountedVolumeSpace(Tag& partition, const Tag& volume) {
+  return writeSpace(partition, volume, true);
 }
 
 void writeUsedPercent(Tag& partition, const VolumeSpace& space) {

@@ -33,6 +33,11 @@ void writeFileSystem(Tag& partition, const Tag& volume);
 /// the keys the volume has.
 VolumeSpace writeVolumeSpace(Tag& partition, const Tag& volume);
 
+/// The same for the mounted volumes of today's profilers, which may give
+/// only the byte counts ("size_in_bytes", "free_space_in_bytes") without
+/// the size texts.
+VolumeSpace writeMountedVolumeSpace(Tag& partition, const Tag& volume);
+
 /// Sets "used%" (truncated percentage) annotated "pos", "max" and "val-units"
 /// when the free space is known. Nothing is written when the percentage is
 /// not a number in range, which covers a volume whose total is zero.

@@ -1,0 +1,23 @@
+// Processor texts of the hardware overview that the Processors section and
+// the asset summary must read alike.
+#ifndef CVN_COLLECT_PROCESSOR_TEXT_H_
+#define CVN_COLLECT_PROCESSOR_TEXT_H_
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace cvn {
+
+/// Apple Silicon's "number_processors" text, "proc T:P:E" (M5 Max prints a
+/// fourth field): the total core count T. Nothing for any other text.
+std::optional<int64_t> coreCountOfProcText(std::string_view text);
+
+/// The maker of a processor by its name: "GenuineIntel" for an Intel name,
+/// "Apple Inc." for a chip whose name begins with "Apple", else empty.
+std::string processorMakerOf(std::string_view model);
+
+}  // namespace cvn
+
+#endif  // CVN_COLLECT_PROCESSOR_TEXT_H_

@@ -1,0 +1,122 @@
+// The quick facts of today's Macs, read from small profiler lists: the asset
+// summary must say what the sections say.
+#include "collect/quick_facts.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "fake_command_runner.h"
+
+namespace cvn {
+namespace {
+
+// A profiler list with one dictionary per data type; `items` is the XML of
+// the "_items" array's elements.
+std::string profilerList(const std::vector<std::pair<std::string, std::string>>& types) {
+  std::string xml = "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\"><array>";
+  for (const auto& [type, items] : types) {
+    xml += "<dict><key>_dataType</key><string>" + type + "</string><key>_items</key><array>" +
+           items + "</array></dict>";
+  }
+  return xml + "</array></plist>\n";
+}
+
+// Every field that comes from the profiler list, one per line, empty ones too.
+std::string factsText(const std::string& list) {
+  PlistValue root;
+  EXPECT_TRUE(parsePlist(list, &root));
+  FakeCommandRunner runner;  // ioreg prints nothing
+  QuickFacts f = readQuickFacts(root, runner);
+  return "packages=" + f.package_count + "\ncores=" + f.processor_count +
+         "\nspeed=" + f.processor_speed + "\nmodel=" + f.processor_model +
+         "\nmaker=" + f.processor_maker + "\nmemory=" + f.physical_memory +
+         "\nvram=" + f.video_memory + "\nresolution=" + f.main_display_resolution +
+         "\nedid=" + f.main_display_edid + "\ndisks=" + f.disk_capacity +
+         "\nvolumes=" + f.volume_capacity + "\nfree=" + f.volume_free + "\n";
+}
+
+TEST(QuickFactsTest, AppleSiliconChipCoresAndMaker) {
+  EXPECT_EQ(factsText(profilerList({{"SPHardwareDataType",
+                                     "<dict><key>chip_type</key><string>Apple M3 Pro</string>"
+                                     "<key>number_processors</key><string>proc 12:6:6</string>"
+                                     "<key>physical_memory</key><string>18 GB</string></dict>"}})),
+            "packages=1\ncores=12\nspeed=\nmodel=Apple M3 Pro\nmaker=Apple Inc.\nmemory=18432\n"
+            "vram=\nresolution=\nedid=\ndisks=\nvolumes=\nfree=\n");
+}
+
+TEST(QuickFactsTest, LateIntelWithADecimalCommaAndEveryOlderForm) {
+  const std::pair<const char*, const char*> cases[] = {
+      {"<key>cpu_type</key><string>Quad-Core Intel Core i7</string>"
+       "<key>current_processor_speed</key><string>2,3 GHz</string>"
+       "<key>number_processors</key><integer>4</integer><key>packages</key><integer>1</integer>",
+       "packages=1\ncores=4\nspeed=2300\nmodel=Quad-Core Intel Core i7\nmaker=GenuineIntel\n"},
+      // A text count that is not Apple Silicon's is passed on as it is;
+      // without a chip nothing invents a package count.
+      {"<key>cpu_type</key><string>PowerPC G4</string>"
+       "<key>current_processor_speed</key><string>867 MHz</string>"
+       "<key>number_processors</key><string>2</string>",
+       "packages=\ncores=2\nspeed=867\nmodel=PowerPC G4\nmaker=\n"},
+      // Apple's virtual machines count cores as an integer; a package
+      // count in a text is no count.
+      {"<key>chip_type</key><string>Apple M4 Max (Virtual)</string>"
+       "<key>number_processors</key><integer>4</integer><key>packages</key><string>1</string>",
+       "packages=\ncores=4\nspeed=\nmodel=Apple M4 Max (Virtual)\nmaker=Apple Inc.\n"},
+  };
+  for (const auto& [keys, expected] : cases) {
+    std::string text =
+        factsText(profilerList({{"SPHardwareDataType", std::string("<dict>") + keys + "</dict>"}}));
+    EXPECT_EQ(text.substr(0, text.find("memory=")), expected) << keys;
+  }
+}
+
+TEST(QuickFactsTest, DiskCapacityCountsNvmeDisksButNotTheirContainers) {
+  const std::string sata =
+      "<dict><key>_items</key><array><dict><key>size</key><string>500,11 GB</string>"
+      "<key>volumes</key><array><dict><key>size</key><string>400 GB</string>"
+      "<key>free_space</key><string>100 GB</string></dict></array></dict></array></dict>";
+  const std::string nvme =
+      "<dict><key>_items</key><array><dict><key>size</key><string>1 TB</string>"
+      "<key>volumes</key><array><dict><key>size</key><string>994.66 GB</string></dict>"
+      "</array></dict></array></dict>";
+  std::string both =
+      factsText(profilerList({{"SPSerialATADataType", sata}, {"SPNVMeDataType", nvme}}));
+  EXPECT_EQ(both.substr(both.find("disks=")), "disks=1500.1\nvolumes=400.0\nfree=100.0\n");
+  std::string nvme_only = factsText(profilerList({{"SPNVMeDataType", nvme}}));
+  EXPECT_EQ(nvme_only.substr(nvme_only.find("disks=")), "disks=1000.0\nvolumes=\nfree=\n");
+}
+
+TEST(QuickFactsTest, MainDisplayOfToday) {
+  auto display = [](const std::string& keys) {
+    return profilerList(
+        {{"SPDisplaysDataType",
+          "<dict><key>sppci_model</key><string>Apple M3 Pro</string>"
+          "<key>spdisplays_ndrvs</key><array><dict><key>_name</key><string>LG</string>"
+          "<key>_spdisplays_resolution</key><string>3840 x 2160 @ 60.00Hz</string></dict>"
+          "<dict>" +
+              keys +
+              "<key>spdisplays_main</key><string>spdisplays_yes</string></dict>"
+              "</array></dict>"}});
+  };
+  const std::pair<std::string, const char*> cases[] = {
+      {"<key>_spdisplays_resolution</key><string>1512 x 982 @ 120.00Hz</string>"
+       "<key>_spdisplays_pixels</key><string>3024 x 1964</string>",
+       "vram=\nresolution=1512 x 982 @ 120.00Hz\nedid=\n"},
+      {"<key>_spdisplays_pixels</key><string>3024 x 1964</string>",
+       "vram=\nresolution=3024 x 1964\nedid=\n"},
+      // The older key wins, even when it says nothing.
+      {"<key>spdisplays_resolution</key><string></string>"
+       "<key>_spdisplays_resolution</key><string>1512 x 982 @ 120.00Hz</string>",
+       "vram=\nresolution=\nedid=\n"},
+  };
+  for (const auto& [keys, expected] : cases) {
+    std::string text = factsText(display(keys));
+    size_t from = text.find("vram="), to = text.find("disks=");
+    EXPECT_EQ(text.substr(from, to - from), expected) << keys;
+  }
+}
+
+}  // namespace
+}  // namespace cvn
