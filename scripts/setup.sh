@@ -6,7 +6,8 @@ set -euo pipefail
 need=()
 have_pkg() { dpkg-query -W -f='${Status}' "$1" 2>/dev/null | grep -q 'install ok installed'; }
 for pkg in cmake g++ make zlib1g-dev libexpat1-dev libgtest-dev libbenchmark-dev \
-           clang libclang-rt-14-dev clang-format git procps llvm-14 file groff-base; do
+           clang libclang-rt-14-dev clang-format git procps llvm-14 file groff-base \
+           strace time; do
   have_pkg "$pkg" || need+=("$pkg")
 done
 # npm fetches the compiler of the macOS cross-build (below). Machines with a
