@@ -6,7 +6,8 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 
 packages=(cmake g++ make zlib1g-dev libexpat1-dev libgtest-dev libbenchmark-dev
-          clang libclang-rt-14-dev clang-format git procps llvm-14 file groff-base)
+          clang libclang-rt-14-dev clang-format git procps llvm-14 file groff-base
+          strace time)
 need=()
 have_pkg() { dpkg-query -W -f='${Status}' "$1" 2>/dev/null | grep -q 'install ok installed'; }
 for pkg in "${packages[@]}"; do

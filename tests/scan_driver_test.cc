@@ -105,7 +105,7 @@ TEST_F(ScanDriverTest, NormalScanWritesTheSnapshotUnderAFreeName) {
   directory_.raced = {"/results/JANE-MBP_0026BB5C3A91(1).qax"};
   directory_.files["/results/JANE-MBP_0026BB5C3A91(2).qax"] = {};
   fakes_.processes.entries = {{1, 0, "launchd"}};
-  runner_.answer("ps -p1 -o user=\"\" -o command=\"\"", "root /sbin/launchd\n");
+  runner_.answer("ps -axww -o pid= -o user= -o command=", "    1 root     /sbin/launchd\n");
   runScan(false, false, true);
 
   const std::string path = "/results/JANE-MBP_0026BB5C3A91(3).qax";
@@ -122,7 +122,9 @@ TEST_F(ScanDriverTest, NormalScanWritesTheSnapshotUnderAFreeName) {
   EXPECT_EQ(snapshot.findProperty("", "scan-time")->value, "1000");
   EXPECT_EQ(snapshot.findProperty("", "hostname")->value, "Jane-MBP");
   EXPECT_EQ(snapshot.findProperty("", "ip-address")->value, "192.168.1.23");
-  EXPECT_NE(snapshot.findNode("Processes"), nullptr);
+  const QaxProperty* command = snapshot.findProperty("/Processes/process:1", "cmd-line");
+  ASSERT_NE(command, nullptr);
+  EXPECT_EQ(command->value, "/sbin/launchd");
   const QaxTree& asset = file.blocks[1].tree;
   EXPECT_EQ(asset.findProperty("", "int-name")->value, "Jane's MacBook");
 }

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <iterator>
 #include <memory>
 #include <unordered_map>
 #include <utility>
@@ -33,14 +34,17 @@ enum class Element {
   kUnknown
 };
 
+// Called for every element of the document: the commonest names come first,
+// and a view compares lengths before bytes.
 Element elementOf(const char* name) {
-  static const std::pair<const char*, Element> kNames[] = {
-      {"plist", Element::kPlist}, {"array", Element::kArray},   {"dict", Element::kDict},
-      {"key", Element::kKey},     {"string", Element::kString}, {"integer", Element::kInteger},
-      {"real", Element::kReal},   {"date", Element::kDate},     {"true", Element::kTrue},
-      {"false", Element::kFalse}, {"data", Element::kData}};
-  for (const auto& entry : kNames)
-    if (std::strcmp(name, entry.first) == 0) return entry.second;
+  static constexpr std::pair<std::string_view, Element> kNames[] = {
+      {"key", Element::kKey},     {"string", Element::kString},   {"dict", Element::kDict},
+      {"array", Element::kArray}, {"integer", Element::kInteger}, {"date", Element::kDate},
+      {"true", Element::kTrue},   {"false", Element::kFalse},     {"real", Element::kReal},
+      {"data", Element::kData},   {"plist", Element::kPlist}};
+  const std::string_view text(name);
+  for (const auto& [element_name, element] : kNames)
+    if (element_name == text) return element;
   return Element::kUnknown;
 }
 
@@ -50,6 +54,49 @@ struct Frame {
   bool has_key = false;
   bool key_refused = false;
   std::unique_ptr<std::unordered_map<std::string, size_t>> index;
+};
+
+// The open containers. A frame's lists are filled in place and keep their
+// room when the container closes: the next container at that depth grows
+// into it, and each closed container gets one list of its exact size. A
+// list growing one entry at a time instead allocated and moved its entries
+// several times for every dictionary of the document.
+class FrameStack {
+ public:
+  bool empty() const { return depth_ == 0; }
+  size_t size() const { return depth_; }
+  Frame& back() { return frames_[depth_ - 1]; }
+
+  void push(PlistValue::Kind kind) {
+    if (depth_ == frames_.size()) frames_.emplace_back();
+    Frame& frame = frames_[depth_++];
+    frame.value.kind = kind;
+    frame.value.array.clear();
+    frame.value.dictionary.clear();
+    frame.key.clear();
+    frame.has_key = false;
+    frame.key_refused = false;
+    frame.index.reset();
+  }
+
+  PlistValue pop() {
+    Frame& frame = frames_[--depth_];
+    PlistValue value;
+    value.kind = frame.value.kind;
+    value.array.reserve(frame.value.array.size());
+    std::move(frame.value.array.begin(), frame.value.array.end(), std::back_inserter(value.array));
+    value.dictionary.reserve(frame.value.dictionary.size());
+    std::move(frame.value.dictionary.begin(), frame.value.dictionary.end(),
+              std::back_inserter(value.dictionary));
+    frame.value.array.clear();
+    frame.value.dictionary.clear();
+    frame.index.reset();
+    return value;
+  }
+
+ private:
+  std::vector<Frame> frames_;
+  size_t depth_ = 0;
 };
 
 class Reader {
@@ -75,7 +122,7 @@ class Reader {
   void note(const std::string& problem);
 
   XML_Parser parser_ = nullptr;
-  std::vector<Frame> stack_;
+  FrameStack stack_;
   // The leaf element being read, if any; leaves never nest.
   bool in_leaf_ = false;
   Element leaf_ = Element::kUnknown;
@@ -176,9 +223,8 @@ void Reader::start(const char* name) {
         ignored_ = 1;
         return;
       }
-      stack_.emplace_back();
-      stack_.back().value.kind =
-          element == Element::kArray ? PlistValue::Kind::kArray : PlistValue::Kind::kDictionary;
+      stack_.push(element == Element::kArray ? PlistValue::Kind::kArray
+                                             : PlistValue::Kind::kDictionary);
       return;
     case Element::kPlist:
     case Element::kUnknown:
@@ -262,9 +308,7 @@ void Reader::end() {
     return;
   }
   if (stack_.empty()) return;  // </plist>
-  PlistValue value = std::move(stack_.back().value);
-  stack_.pop_back();
-  attach(std::move(value));
+  attach(stack_.pop());
 }
 
 void XMLCALL Reader::onStart(void* self, const XML_Char* name, const XML_Char**) {
@@ -292,7 +336,8 @@ struct ParserFree {
 };
 
 bool Reader::read(std::string_view document, PlistValue* out, std::string* warning) {
-  std::string cleaned = escapeRefusedBytes(document);
+  std::string storage;
+  const std::string_view cleaned = escapeRefusedBytes(document, &storage);
   // The declared encoding is overridden: the cleaning works on UTF-8 bytes.
   std::unique_ptr<XML_ParserStruct, ParserFree> parser(XML_ParserCreate("UTF-8"));
   if (!parser) return false;
@@ -322,9 +367,7 @@ bool Reader::read(std::string_view document, PlistValue* out, std::string* warni
     in_leaf_ = false;
     ignored_ = 0;
     while (!stack_.empty()) {
-      PlistValue value = std::move(stack_.back().value);
-      stack_.pop_back();
-      attach(std::move(value));
+      attach(stack_.pop());
     }
   }
   parser_ = nullptr;

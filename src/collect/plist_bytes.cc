@@ -76,12 +76,33 @@ bool isXmlChar(uint32_t cp) {
   return cp <= 0x10FFFF;
 }
 
+// Bytes that pass through character data unchanged and end no state: most
+// of a document. Runs of them are skipped, or copied, in one step.
+struct PlainBytes {
+  bool text[256] = {};
+  bool markup[256] = {};
+  constexpr PlainBytes() {
+    for (int c = 0x20; c < 0x80; ++c) {
+      text[c] = c != '<' && c != '&' && c != '>' && c != ']';
+      markup[c] = c != '"' && c != '\'' && c != '>' && c != '[' && c != ']';
+    }
+    for (unsigned char c : {'\t', '\n'}) text[c] = markup[c] = true;
+    markup[static_cast<unsigned char>('\r')] = true;
+    for (int c = 0x80; c < 0x100; ++c) markup[c] = true;
+  }
+};
+constexpr PlainBytes kPlain;
+
+// Most documents need no escaping at all: the output is then the input
+// itself, and nothing is copied until the first byte that changes.
 class Cleaner {
  public:
   explicit Cleaner(std::string_view in)
       : p_(reinterpret_cast<const unsigned char*>(in.data())), n_(in.size()) {}
 
-  std::string run();
+  /// The cleaned text: a view of the input, or of `storage` once a byte
+  /// had to change.
+  std::string_view run(std::string* storage);
 
  private:
   enum class State { kText, kTag, kComment, kProcessing, kCData, kDeclaration };
@@ -91,8 +112,24 @@ class Cleaner {
     return n_ - i_ >= len && std::memcmp(p_ + i_, s, len) == 0;
   }
   void copy(size_t len) {
-    out_.append(reinterpret_cast<const char*>(p_ + i_), len);
+    if (changed_) out_->append(reinterpret_cast<const char*>(p_ + i_), len);
     i_ += len;
+  }
+  // The text up to here is the input's; from now on the output is built.
+  std::string& change() {
+    if (!changed_) {
+      changed_ = true;
+      out_->clear();
+      out_->reserve(n_ - start_ + (n_ - start_) / 32 + 16);
+      out_->append(reinterpret_cast<const char*>(p_ + start_), i_ - start_);
+    }
+    return *out_;
+  }
+  // A run of bytes for which `plain` holds, from the current one on.
+  size_t plainRun(const bool* plain) const {
+    size_t j = i_;
+    while (j < n_ && plain[p_[j]]) ++j;
+    return j - i_;
   }
   // One character of content: control bytes, stray bytes and our own private
   // range are escaped, everything else is copied.
@@ -102,7 +139,9 @@ class Cleaner {
   const unsigned char* p_;
   size_t n_;
   size_t i_ = 0;
-  std::string out_;
+  size_t start_ = 0;
+  bool changed_ = false;
+  std::string* out_ = nullptr;
 };
 
 void Cleaner::copyContentByte(bool escape_cr) {
@@ -110,20 +149,21 @@ void Cleaner::copyContentByte(bool escape_cr) {
   if (c < 0x80) {
     bool refused = c < 0x20 && c != '\t' && c != '\n' && (c != '\r' || escape_cr);
     if (refused) {
-      appendEscapedByte(out_, c);
+      appendEscapedByte(change(), c);
+      ++i_;
     } else {
-      out_ += static_cast<char>(c);
+      copy(1);
     }
-    ++i_;
     return;
   }
   uint32_t cp = 0;
   size_t len = sequenceLength(p_ + i_, n_ - i_, &cp);
   if (len == 0) {
-    appendEscapedByte(out_, c);
+    appendEscapedByte(change(), c);
     ++i_;
   } else if (cp >= kEscapeBase && cp <= kPrivateLast) {
-    for (size_t k = 0; k < len; ++k) appendEscapedByte(out_, p_[i_ + k]);
+    std::string& out = change();
+    for (size_t k = 0; k < len; ++k) appendEscapedByte(out, p_[i_ + k]);
     i_ += len;
   } else {
     copy(len);
@@ -149,12 +189,12 @@ void Cleaner::copyReference() {
     if (digits > 0 && digits <= 8 && j < n_ && p_[j] == ';') {
       size_t len = j + 1 - i_;
       if (value < 0x20 && value != '\t' && value != '\n' && value != '\r') {
-        appendEscapedByte(out_, static_cast<unsigned char>(value));
+        appendEscapedByte(change(), static_cast<unsigned char>(value));
         i_ += len;
         return;
       }
       if (value >= kEscapeBase && value <= kPrivateLast) {
-        appendEscapedCodePoint(out_, value);
+        appendEscapedCodePoint(change(), value);
         i_ += len;
         return;
       }
@@ -166,17 +206,18 @@ void Cleaner::copyReference() {
   }
   // Anything else makes CoreFoundation refuse the value: mark it and let the
   // rest of the reference pass as plain text.
-  appendUtf8(out_, kPoison);
+  appendUtf8(change(), kPoison);
   ++i_;
 }
 
-std::string Cleaner::run() {
-  out_.reserve(n_ + n_ / 32 + 16);
+std::string_view Cleaner::run(std::string* storage) {
+  out_ = storage;
   // CoreFoundation takes blanks before the declaration; expat does not.
   size_t lead = 0;
   while (lead < n_ && (p_[lead] == ' ' || p_[lead] == '\t' || p_[lead] == '\r' || p_[lead] == '\n'))
     ++lead;
   if (lead > 0 && n_ - lead >= 5 && std::memcmp(p_ + lead, "<?xml", 5) == 0) i_ = lead;
+  start_ = i_;
 
   State state = State::kText;
   bool root_started = false;
@@ -187,7 +228,10 @@ std::string Cleaner::run() {
     unsigned char c = p_[i_];
     switch (state) {
       case State::kText:
-        if (c == '<') {
+        if (kPlain.text[c]) {
+          closing_brackets = 0;
+          copy(plainRun(kPlain.text));
+        } else if (c == '<') {
           closing_brackets = 0;
           if (startsWith("<!--")) {
             state = State::kComment;
@@ -214,7 +258,7 @@ std::string Cleaner::run() {
           copyReference();
         } else if (c == '>' && closing_brackets >= 2) {
           closing_brackets = 0;
-          appendEscapedByte(out_, c);
+          appendEscapedByte(change(), c);
           ++i_;
         } else {
           closing_brackets = c == ']' ? closing_brackets + 1 : 0;
@@ -239,6 +283,10 @@ std::string Cleaner::run() {
       case State::kTag:
       case State::kDeclaration:
         // Quoted text hides markup in both; only a declaration nests "[...]".
+        if (!quote && kPlain.markup[c]) {
+          copy(plainRun(kPlain.markup));
+          break;
+        }
         if (quote) {
           if (c == quote) quote = 0;
         } else if (c == '"' || c == '\'') {
@@ -252,7 +300,8 @@ std::string Cleaner::run() {
         break;
     }
   }
-  return std::move(out_);
+  if (changed_) return *out_;
+  return std::string_view(reinterpret_cast<const char*>(p_ + start_), n_ - start_);
 }
 
 }  // namespace
@@ -280,6 +329,8 @@ bool restoreEscapedBytes(std::string& s) {
   return clean;
 }
 
-std::string escapeRefusedBytes(std::string_view document) { return Cleaner(document).run(); }
+std::string_view escapeRefusedBytes(std::string_view document, std::string* storage) {
+  return Cleaner(document).run(storage);
+}
 
 }  // namespace cvn

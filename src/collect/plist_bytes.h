@@ -19,8 +19,10 @@ namespace cvn {
 // reader drops that one value.
 
 /// The document with every such byte of character data escaped, ready for
-/// expat (read as UTF-8). Markup is copied as it is.
-std::string escapeRefusedBytes(std::string_view document);
+/// expat (read as UTF-8). Markup is kept as it is. The result is a view of
+/// `document` itself when nothing had to change (the usual case), else of
+/// `storage`, which then holds the escaped copy.
+std::string_view escapeRefusedBytes(std::string_view document, std::string* storage);
 
 /// Turns escaped bytes of a parsed string or key back into bytes, in place.
 /// False when the text holds the mark of a value CoreFoundation would refuse.

@@ -2,7 +2,10 @@
 
 #include <cinttypes>
 #include <cstdio>
+#include <ctime>
 #include <deque>
+#include <type_traits>
+#include <utility>
 #include <vector>
 
 #include "zxml/date_text.h"
@@ -27,11 +30,16 @@ bool isNamedListKey(const std::string& key) {
   return key == "spfirewall_applications" || key == "spfirewall_services";
 }
 
+// A list being taken apart gives its text away.
+TagValue textOf(const PlistValue& value) { return TagValue(value.text); }
+TagValue textOf(PlistValue& value) { return TagValue(std::move(value.text)); }
+
 // Nothing (type none) for the kinds that store nothing.
-TagValue leafValue(const PlistValue& value, bool top_level) {
+template <typename Value>
+TagValue leafValue(Value& value, bool top_level) {
   switch (value.kind) {
     case PlistValue::Kind::kString:
-      return TagValue(value.text);
+      return textOf(value);
     case PlistValue::Kind::kInteger:
       if (top_level) {
         char buf[32];
@@ -42,7 +50,8 @@ TagValue leafValue(const PlistValue& value, bool top_level) {
     case PlistValue::Kind::kReal:
       return TagValue(value.real);
     case PlistValue::Kind::kDate: {
-      std::string text = formatLocalDate(value.integer, true);
+      // The zone was read once when the conversion began.
+      std::string text = formatLocalDateInCurrentZone(value.integer, true);
       if (text.empty()) return TagValue();
       return TagValue(std::move(text));
     }
@@ -70,21 +79,17 @@ struct PlistConverter::Node {
     return *tag;
   }
 
-  void store(std::string_view key, const TagValue& value) {
+  void store(std::string_view key, TagValue&& value) {
     if (value.isNone()) return;
     if (tag) {
-      tag->setProperty(key, value);
+      tag->setProperty(key, std::move(value));
       return;
     }
     if (!name.empty()) {
-      // The first leaf goes through the path setter one step up, which turns
-      // this tag into a branch just as a path from the top would.
-      Tag& above = parent->create();
-      std::string step = name;
-      step += '/';
-      step += key;
-      above.setPropertyByPath(step, value);
-      tag = above.findChild(name);
+      // The tag is made a branch, just as storing by a path from the top
+      // would step through it.
+      tag = &parent->create().addBranch(name);
+      tag->setProperty(key, std::move(value));
       return;
     }
     storeByFullPath(key, value);
@@ -154,16 +159,25 @@ void PlistConverter::chainFor(std::string_view path, std::deque<Node>& chain) {
   }
 }
 
-void PlistConverter::convertPlist(const PlistValue& root) {
+void PlistConverter::convertPlist(const PlistValue& root) { convertRoot(root); }
+
+void PlistConverter::convertPlist(PlistValue&& root) {
+  convertRoot(root);
+  root = PlistValue();
+}
+
+template <typename Value>
+void PlistConverter::convertRoot(Value& root) {
   if (!root.isArray()) return;
-  for (const PlistValue& element : root.array) {
+  tzset();
+  for (auto& element : root.array) {
     if (!element.isDictionary()) continue;
     const std::string* data_type = element.findText("_dataType");
     if (!data_type || isSkippedDataType(*data_type)) continue;
     std::deque<Node> chain;
     chainFor("/" + *data_type, chain);
     Node& base = chain.back();
-    for (const PlistEntry& entry : element.dictionary) {
+    for (auto& entry : element.dictionary) {
       if (isSkippedTopKey(entry.key)) continue;
       std::string key = sanitizeKey(entry.key);
       if (entry.value.isDictionary() || entry.value.isArray()) {
@@ -176,25 +190,28 @@ void PlistConverter::convertPlist(const PlistValue& root) {
 }
 
 void PlistConverter::convertDictionary(const PlistValue& dictionary, std::string_view path) {
+  tzset();
   std::deque<Node> chain;
   chainFor(path, chain);
   walkDictionary(dictionary, chain.back(), 0);
 }
 
 void PlistConverter::convertArray(const PlistValue& array, std::string_view path) {
+  tzset();
   std::deque<Node> chain;
   chainFor(path, chain);
   walkArray(array, chain.back(), 0);
 }
 
 void PlistConverter::convertNamedList(const PlistValue& dictionary, std::string_view path) {
+  tzset();
   std::deque<Node> chain;
   chainFor(path, chain);
   walkNamedList(dictionary, chain.back());
 }
 
-void PlistConverter::walkValue(const PlistValue& value, Node& parent, std::string name,
-                               size_t depth) {
+template <typename Value>
+void PlistConverter::walkValue(Value& value, Node& parent, std::string name, size_t depth) {
   if (value.isDictionary() || value.isArray()) {
     if (depth >= kMaxDepth) return;
     Node child;
@@ -210,9 +227,10 @@ void PlistConverter::walkValue(const PlistValue& value, Node& parent, std::strin
   parent.store(name, leafValue(value, false));
 }
 
-void PlistConverter::walkDictionary(const PlistValue& dictionary, Node& node, size_t depth) {
+template <typename Value>
+void PlistConverter::walkDictionary(Value& dictionary, Node& node, size_t depth) {
   if (!dictionary.isDictionary()) return;
-  for (const PlistEntry& entry : dictionary.dictionary) {
+  for (auto& entry : dictionary.dictionary) {
     if (entry.value.isDictionary() && isNamedListKey(entry.key)) {
       Node child;
       child.parent = &node;
@@ -224,22 +242,27 @@ void PlistConverter::walkDictionary(const PlistValue& dictionary, Node& node, si
   }
 }
 
-void PlistConverter::walkArray(const PlistValue& array, Node& node, size_t depth) {
+template <typename Value>
+void PlistConverter::walkArray(Value& array, Node& node, size_t depth) {
   if (!array.isArray()) return;
-  for (size_t i = 0; i < array.array.size(); ++i)
+  for (size_t i = 0; i < array.array.size(); ++i) {
     walkValue(array.array[i], node, "item" + std::to_string(i), depth);
+    // Taking apart: the item's tag holds everything it had.
+    if constexpr (!std::is_const_v<Value>) array.array[i] = PlistValue();
+  }
 }
 
-void PlistConverter::walkNamedList(const PlistValue& dictionary, Node& node) {
+template <typename Value>
+void PlistConverter::walkNamedList(Value& dictionary, Node& node) {
   if (!dictionary.isDictionary()) return;
   for (size_t i = 0; i < dictionary.dictionary.size(); ++i) {
-    const PlistEntry& entry = dictionary.dictionary[i];
+    auto& entry = dictionary.dictionary[i];
     if (!entry.value.isString()) continue;  // its number stays used
     Node item;
     item.parent = &node;
     item.name = "item" + std::to_string(i);
     item.store("_name", TagValue(entry.key));
-    item.store("value", TagValue(entry.value.text));
+    item.store("value", textOf(entry.value));
   }
 }
 

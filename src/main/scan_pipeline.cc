@@ -67,17 +67,18 @@ ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part
   extra_documents.clear();
 
   QuickFacts facts = readQuickFacts(plist, sources.runner);
-  auto raw = std::make_unique<TagTree>(request.native, "Macintosh");
-  logStage(request, "II. Parsing Data....");
-  PlistConverter(*raw).convertPlist(plist);
-  logStage(request, "done\n");
-  logStage(request, "III. Get Data For AssetInfo....");
+  // Read before the conversion, which takes the list apart so that the list
+  // and the raw tree are never both whole in memory.
   NetworkIdentity identity;
   readNetworkIdentity(plist, ip, &identity);
-  logStage(request, "33% ");
   std::string serial = readSerialNumber(plist);
+  auto raw = std::make_unique<TagTree>(request.native, "Macintosh");
+  logStage(request, "II. Parsing Data....");
+  PlistConverter(*raw).convertPlist(std::move(plist));
+  logStage(request, "done\n");
+  logStage(request, "III. Get Data For AssetInfo....");
+  logStage(request, "33% ");
   logStage(request, "66% ");
-  plist = PlistValue();
   collectProcesses(*raw, sources.processes, sources.runner);
   logStage(request, "100% done\n");
 

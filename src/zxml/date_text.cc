@@ -7,11 +7,15 @@
 namespace cvn {
 
 std::string formatLocalDate(int64_t seconds, bool long_form) {
-  time_t t = static_cast<time_t>(seconds);
-  if (static_cast<int64_t>(t) != seconds) return std::string();
   // localtime_r need not look at TZ again; a zone changed since the last
   // tzset() would otherwise be ignored.
   tzset();
+  return formatLocalDateInCurrentZone(seconds, long_form);
+}
+
+std::string formatLocalDateInCurrentZone(int64_t seconds, bool long_form) {
+  time_t t = static_cast<time_t>(seconds);
+  if (static_cast<int64_t>(t) != seconds) return std::string();
   struct tm local;
   if (!localtime_r(&t, &local)) return std::string();
   char buf[96];

@@ -12,6 +12,10 @@ namespace cvn {
 /// minutes without padding ("+180", "-300", "+0"); short form "yyyy-MM-dd".
 /// Empty when the date cannot be represented in local time.
 std::string formatLocalDate(int64_t seconds, bool long_form);
+/// The same without reading the zone again: for many dates in a row, after
+/// one formatLocalDate() or tzset(). Re-reading costs a look at the zone
+/// file for every date.
+std::string formatLocalDateInCurrentZone(int64_t seconds, bool long_form);
 
 }  // namespace cvn
 

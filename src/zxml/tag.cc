@@ -172,7 +172,7 @@ Tag::Tag(Kind kind, std::string name) : kind_(kind), name_(std::move(name)) {}
 
 Tag* Tag::findChild(std::string_view name) const {
   if (child_index_) {
-    auto it = child_index_->find(std::string(name));
+    auto it = child_index_->find(name);
     return it == child_index_->end() ? nullptr : it->second;
   }
   for (const auto& c : children_)
@@ -182,7 +182,7 @@ Tag* Tag::findChild(std::string_view name) const {
 
 TagProperty* Tag::findProperty(std::string_view name) const {
   if (property_index_) {
-    auto it = property_index_->find(std::string(name));
+    auto it = property_index_->find(name);
     return it == property_index_->end() ? nullptr : it->second;
   }
   for (const auto& p : properties_)
@@ -201,7 +201,7 @@ Tag& Tag::appendChild(std::string_view name) {
   if (child_index_) {
     child_index_->emplace(child->name_, child);  // keeps the first match
   } else if (children_.size() > kIndexThreshold) {
-    child_index_ = std::make_unique<std::unordered_map<std::string, Tag*>>();
+    child_index_ = std::make_unique<std::unordered_map<std::string_view, Tag*>>();
     for (const auto& c : children_) child_index_->emplace(c->name_, c.get());
   }
   return *child;
@@ -213,6 +213,12 @@ Tag& Tag::addChild(std::string_view name) {
     return *existing;
   }
   return appendChild(name);
+}
+
+Tag& Tag::addBranch(std::string_view name) {
+  Tag& child = addChild(name);
+  child.makeBranch();
+  return child;
 }
 
 Tag& Tag::setChildValue(std::string_view name, const TagValue& value) {
@@ -229,23 +235,35 @@ void Tag::setValue(const TagValue& value) {
   }
 }
 
+TagProperty& Tag::appendProperty(std::string_view name) {
+  properties_.push_back(std::make_unique<TagProperty>(std::string(name)));
+  TagProperty& prop = *properties_.back();
+  if (property_index_) {
+    property_index_->emplace(prop.name(), &prop);
+  } else if (properties_.size() > kIndexThreshold) {
+    property_index_ = std::make_unique<std::unordered_map<std::string_view, TagProperty*>>();
+    for (const auto& p : properties_) property_index_->emplace(p->name(), p.get());
+  }
+  return prop;
+}
+
 TagProperty& Tag::setProperty(std::string_view name, const TagValue& value, const char* note_key,
                               const char* note_text) {
   if (TagProperty* existing = findProperty(name)) {
     existing->setValue(value);
     return *existing;
   }
-  properties_.push_back(std::make_unique<TagProperty>(std::string(name)));
-  TagProperty& prop = *properties_.back();
+  TagProperty& prop = appendProperty(name);
   prop.setValue(value);
   if (note_key && note_text) prop.addAnnotation(note_key, note_text);
-  if (property_index_) {
-    property_index_->emplace(prop.name(), &prop);
-  } else if (properties_.size() > kIndexThreshold) {
-    property_index_ = std::make_unique<std::unordered_map<std::string, TagProperty*>>();
-    for (const auto& p : properties_) property_index_->emplace(p->name(), p.get());
-  }
   return prop;
+}
+
+TagProperty& Tag::setProperty(std::string_view name, TagValue&& value) {
+  TagProperty* prop = findProperty(name);
+  if (!prop) prop = &appendProperty(name);
+  prop->setValue(std::move(value));
+  return *prop;
 }
 
 void Tag::addAnnotation(std::string key, std::string text) {
@@ -331,7 +349,9 @@ void Tag::annotatePropertyByPath(std::string_view path, const std::string& key,
 void Tag::copyFrom(const Tag& other) {
   if (this == &other) return;
   kind_ = other.kind_;
-  name_ = other.name_;
+  // A parent's index views this name's bytes, so an equal name is left
+  // alone; a different one is only allowed on a tag no parent lists.
+  if (name_ != other.name_) name_ = other.name_;
   value_ = other.value_ ? std::make_unique<TagValue>(*other.value_) : nullptr;
   annotations_ = other.annotations_;
   properties_.clear();

@@ -92,6 +92,7 @@ class TagProperty {
   const std::vector<Annotation>& annotations() const { return annotations_; }
 
   void setValue(const TagValue& v) { value_ = v; }
+  void setValue(TagValue&& v) { value_ = std::move(v); }
   void addAnnotation(std::string key, std::string text);
   /// Replaces the text of the first annotation with `key`, or appends one.
   void setAnnotation(std::string_view key, std::string_view text);
@@ -129,6 +130,9 @@ class Tag {
 
   /// Get-or-add: the existing child of that name, else a new leaf child.
   Tag& addChild(std::string_view name);
+  /// addChild(name), and the child counts as a branch from now on, as a
+  /// path step through it leaves it, even while it holds only properties.
+  Tag& addBranch(std::string_view name);
   /// addChild(name), then the child's value becomes a copy of `value`.
   Tag& setChildValue(std::string_view name, const TagValue& value);
   void setValue(const TagValue& value);
@@ -136,6 +140,8 @@ class Tag {
   /// carries the annotation (note_key, note_text) when both are non-null.
   TagProperty& setProperty(std::string_view name, const TagValue& value,
                            const char* note_key = nullptr, const char* note_text = nullptr);
+  /// The same, taking the value over instead of copying it.
+  TagProperty& setProperty(std::string_view name, TagValue&& value);
   void addAnnotation(std::string key, std::string text);
   /// The first "<base><N>" for N = 1, 2, ... that no child bears.
   std::string nextNumberedName(std::string_view base) const;
@@ -177,10 +183,14 @@ class Tag {
   std::vector<std::unique_ptr<Tag>> children_;
   std::vector<std::unique_ptr<TagProperty>> properties_;
   std::vector<Annotation> annotations_;
+  TagProperty& appendProperty(std::string_view name);
+
   // First-match indexes, built once a list grows past kIndexThreshold; most
-  // tags never need one, so they cost a pointer until then.
-  std::unique_ptr<std::unordered_map<std::string, Tag*>> child_index_;
-  std::unique_ptr<std::unordered_map<std::string, TagProperty*>> property_index_;
+  // tags never need one, so they cost a pointer until then. The keys view
+  // the names the children and properties own: those live on the heap and
+  // keep their names, so a lookup or an insert copies no text.
+  std::unique_ptr<std::unordered_map<std::string_view, Tag*>> child_index_;
+  std::unique_ptr<std::unordered_map<std::string_view, TagProperty*>> property_index_;
 };
 
 /// Names for the flags of dumpText, serialise and SnapshotFile::addTree, so
