@@ -1,0 +1,89 @@
+// Storage for trees that are built once, read, and dropped whole: the parsed
+// property list, the raw tree and the snapshot. Each allocation is a bump of
+// a pointer inside a large block, and dropping the arena frees a handful of
+// blocks instead of one allocation per node, name and text. A scan of a
+// machine with many applications makes millions of small nodes; one heap
+// allocation apiece cost more than parsing and compressing together, and
+// the freed pieces scattered later allocations across the heap.
+#ifndef CVN_ZXML_ARENA_H_
+#define CVN_ZXML_ARENA_H_
+
+#include <cstddef>
+#include <cstdint>
+#include <new>
+#include <string_view>
+#include <utility>
+
+namespace cvn {
+
+class Arena {
+ public:
+  Arena() = default;
+  Arena(const Arena&) = delete;
+  Arena& operator=(const Arena&) = delete;
+  Arena(Arena&& other) noexcept;
+  Arena& operator=(Arena&& other) noexcept;
+  ~Arena();
+
+  /// Uninitialised room for `size` bytes at `alignment` (a power of two),
+  /// valid until the arena is destroyed. Never null; throws std::bad_alloc.
+  void* allocate(size_t size, size_t alignment);
+
+  /// A new T in the arena. Its destructor never runs: only types whose
+  /// destruction frees nothing outside the arena belong here.
+  template <typename T, typename... Args>
+  T* make(Args&&... args) {
+    return new (allocate(sizeof(T), alignof(T))) T(std::forward<Args>(args)...);
+  }
+
+  /// Room for `count` default-constructed Ts.
+  template <typename T>
+  T* makeArray(size_t count) {
+    T* items = static_cast<T*>(allocate(sizeof(T) * count, alignof(T)));
+    for (size_t i = 0; i < count; ++i) new (items + i) T();
+    return items;
+  }
+
+  /// A copy of `text` with a NUL byte after it, so that the copy can also be
+  /// handed to C functions.
+  std::string_view copyText(std::string_view text);
+
+  /// Keeps what `other` holds alive for as long as this arena; `other` is
+  /// left empty. Lets values move between trees without copying.
+  void adopt(Arena&& other);
+
+  /// Bytes taken from the heap so far (blocks, not what was handed out).
+  size_t bytesReserved() const { return reserved_; }
+
+ private:
+  struct Block {
+    Block* next;
+    size_t size;  // usable bytes after the header
+  };
+
+  void* allocateSlow(size_t size, size_t alignment);
+  Block* newBlock(size_t size);
+  void release();
+
+  Block* blocks_ = nullptr;  // the block being filled first
+  char* cursor_ = nullptr;
+  char* limit_ = nullptr;
+  size_t next_block_ = 0;
+  size_t reserved_ = 0;
+};
+
+inline void* Arena::allocate(size_t size, size_t alignment) {
+  // The common case inline: the current block has room.
+  uintptr_t at = (reinterpret_cast<uintptr_t>(cursor_) + alignment - 1) & ~(alignment - 1);
+  if (cursor_ && size <= static_cast<size_t>(limit_ - cursor_) &&
+      at - reinterpret_cast<uintptr_t>(cursor_) <= static_cast<size_t>(limit_ - cursor_) - size) {
+    char* p = reinterpret_cast<char*>(at);
+    cursor_ = p + size;
+    return p;
+  }
+  return allocateSlow(size, alignment);
+}
+
+}  // namespace cvn
+
+#endif  // CVN_ZXML_ARENA_H_
