@@ -33,8 +33,10 @@ std::string diskSizes(const std::string& file) {
   for (const auto& disk : storage->firstChild()->children()) {
     const TagProperty* size = disk->findProperty("size");
     const Annotation* base = size ? size->findAnnotation("base-value") : nullptr;
-    out += disk->name() + (size ? " " + size->value().textForm() : "") +
-           (base ? " " + base->text : "") + "\n";
+    out.append(disk->name());
+    if (size) out += " " + size->value().textForm();
+    if (base) out.append(" ").append(base->text);
+    out += "\n";
   }
   return out;
 }

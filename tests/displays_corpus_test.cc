@@ -40,11 +40,11 @@ TEST(DisplaysCorpusTest, RecordedDisplayDataBuildsTheVideoSection) {
       for (size_t i = 0; displays && i < displays->children().size(); ++i) {
         const Tag& display = *displays->children()[i];
         if (rawText(display, "spdisplays_status") != "spdisplays_not_connected") ++connected;
-        std::string year = rawText(display, "_spdisplays_display-year");
+        std::string year(rawText(display, "_spdisplays_display-year"));
         EdidInfo info;
         if (!decodeEdidText(rawText(display, "_spdisplays_edid"), &info) || year.empty()) continue;
         EXPECT_EQ(info.week + " " + info.year,
-                  rawText(display, "_spdisplays_display-week") + " " + year);
+                  std::string(rawText(display, "_spdisplays_display-week")) + " " + year);
       }
     }
     EXPECT_EQ(monitors->children().size(), connected) << entry.path();

@@ -108,7 +108,8 @@ TEST(StorageSectionTest, SizeRoundingAndUsedShare) {
     const TagProperty* used =
         storage->findChild("Logical-disks")->firstChild()->findProperty("used%");
     std::string text =
-        size ? size->value().textForm() + "/" + size->findAnnotation("base-value")->text : "-";
+        size ? size->value().textForm() + "/" + std::string(size->findAnnotation("base-value")->text)
+             : "-";
     EXPECT_EQ(text + " " + (used ? used->value().textForm() : "-"), c.expected) << c.expected;
   }
 }

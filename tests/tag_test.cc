@@ -46,7 +46,8 @@ c=7
 }
 
 TEST(TagTest, NumberedNamesFillTheFirstGap) {
-  Tag tag(Tag::Kind::kBranch, "Disks");
+  TagTree tree(true, "Disks");
+  Tag& tag = tree.top();
   EXPECT_EQ(tag.nextNumberedName("Disk"), "Disk1");
   tag.addChild("Disk1");
   tag.addChild("Disk3");

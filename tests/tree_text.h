@@ -13,17 +13,22 @@ namespace cvn {
 
 inline std::string valueText(const TagValue* v) {
   if (!v || v->isNone()) return "";
-  if (v->isText()) return "\"" + v->text() + "\"";
+  if (v->isText()) return "\"" + std::string(v->text()) + "\"";
   return v->textForm();
 }
 
 inline void appendTreeText(const Tag& tag, std::string& out) {
   bool branch = tag.kind() != Tag::Kind::kLeaf;
-  out += (branch ? "+" : "*") + tag.name() + "=" + valueText(tag.value()) + "\n";
-  for (const Annotation& a : tag.annotations()) out += "~" + a.key + "=" + a.text + "\n";
+  auto annotate = [&out](const Annotation& a) {
+    out.append("~").append(a.key).append("=").append(a.text).append("\n");
+  };
+  out.append(branch ? "+" : "*").append(tag.name()).append("=");
+  out += valueText(tag.value()) + "\n";
+  for (const Annotation& a : tag.annotations()) annotate(a);
   for (const auto& p : tag.properties()) {
-    out += p->name() + "=" + valueText(&p->value()) + "\n";
-    for (const Annotation& a : p->annotations()) out += "~" + a.key + "=" + a.text + "\n";
+    out.append(p->name()).append("=");
+    out += valueText(&p->value()) + "\n";
+    for (const Annotation& a : p->annotations()) annotate(a);
   }
   for (const auto& c : tag.children()) appendTreeText(*c, out);
   if (branch) out += "-\n";

@@ -10,10 +10,14 @@ namespace {
 constexpr size_t kDateLength = 8;
 
 void writeApplication(Tag& software, const Tag& item) {
-  std::string name = rawText(item, "_name");
+  std::string_view name = rawText(item, "_name");
   // Records are found by name, so two copies of one version share a record.
-  std::string record_name = "Soft:" + name;
-  if (hasKey(item, "version")) record_name += " " + rawText(item, "version");
+  std::string record_name = "Soft:";
+  record_name += name;
+  if (hasKey(item, "version")) {
+    record_name += ' ';
+    record_name += rawText(item, "version");
+  }
   Tag& app = software.setChildValue(record_name, TagValue(name));
 
   copyFieldIfPresent(app, "version", item, "version");

@@ -36,9 +36,9 @@ const TagValue* rawValue(const Tag& item, std::string_view key) {
   return p ? &p->value() : nullptr;
 }
 
-std::string rawText(const Tag& item, std::string_view key) {
+std::string_view rawText(const Tag& item, std::string_view key) {
   const TagValue* v = rawValue(item, key);
-  return v && v->isText() ? v->text() : std::string();
+  return v ? v->text() : std::string_view();
 }
 
 bool hasKey(const Tag& item, std::string_view key) { return item.findProperty(key) != nullptr; }

@@ -28,8 +28,9 @@ bool isUnifiedMemory(const Tag& item);
 
 /// The raw key's value, or null when the key is missing.
 const TagValue* rawValue(const Tag& item, std::string_view key);
-/// The raw key's text: its value when that is text, else empty.
-std::string rawText(const Tag& item, std::string_view key);
+/// The raw key's text: its value when that is text, else empty. A view
+/// into the raw tree.
+std::string_view rawText(const Tag& item, std::string_view key);
 bool hasKey(const Tag& item, std::string_view key);
 
 /// Copy: sets `field` to the raw value whatever its kind; a missing key gives

@@ -28,7 +28,7 @@ void writeRules(Tag& firewall, std::string_view group_name, const char* record_f
 }
 
 void writeFirewall(Tag& firewall, const Tag& item) {
-  std::string state = rawText(item, "spfirewall_globalstate");
+  std::string_view state = rawText(item, "spfirewall_globalstate");
   if (state == "spfirewall_globalstate_limit_connections") {
     firewall.setProperty("status", TagValue("1"));
   } else if (state == "spfirewall_globalstate_block_all") {

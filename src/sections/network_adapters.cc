@@ -24,8 +24,8 @@ void copyJoinedList(Tag& record, const char* field, const Tag& item, const char*
 }
 
 // "00:1a:2b:3c:4d:5e" in the dash form the rest of the snapshot uses.
-std::string toDashedMacAddress(const std::string& address) {
-  std::string dashed = address;
+std::string toDashedMacAddress(std::string_view address) {
+  std::string dashed(address);
   for (char& c : dashed) {
     if (c == ':') {
       c = '-';

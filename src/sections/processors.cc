@@ -47,8 +47,8 @@ int64_t cacheSizePerPackage(const Tag& item, const char* whole_key, const char* 
 // GHz x 1000 can land a hair below the whole number it stands for (2.01 x
 // 1000 is 2009.99...), so a result within a millionth of a whole number is
 // taken as that number before truncating.
-int64_t speedInMegahertz(const std::string& text) {
-  std::string number = firstWord(text);
+int64_t speedInMegahertz(std::string_view text) {
+  std::string number(firstWord(text));
   for (char& c : number)
     if (c == ',') c = '.';
   double mhz = std::strtod(number.c_str(), nullptr) * 1000.0;

@@ -72,7 +72,7 @@ class StorageWriter {
   // A volume of SPStorageDataType, unless a disk already gave it.
   void addMountedVolume(const Tag& volume) {
     if (!hasKey(volume, "_name") || isDiskImage(volume)) return;
-    std::string mount_point = rawText(volume, "mount_point");
+    std::string_view mount_point = rawText(volume, "mount_point");
     if (mount_point.empty() && !hasFreeSpace(volume)) return;
     if (wasRecorded(volume)) return;
     remember(volume);
@@ -96,7 +96,7 @@ class StorageWriter {
       gigabytes = bytesToDecimalGigabytes(bytes);
     } else if (hasKey(device, "size")) {
       // The text form ("500,11 GB") is rounded: a fraction above .4 counts up.
-      std::string text = rawText(device, "size");
+      std::string_view text = rawText(device, "size");
       gigabytes = SizeText::toDecimalGigabytes(text, true);
       bytes = SizeText::toBytes(text);
     } else {
@@ -109,15 +109,15 @@ class StorageWriter {
   // The same volume can be listed by its disk and again among the mounted
   // volumes; its device name or mount point tells.
   bool wasRecorded(const Tag& volume) const {
-    std::string bsd_name = rawText(volume, "bsd_name");
-    std::string mount_point = rawText(volume, "mount_point");
+    std::string_view bsd_name = rawText(volume, "bsd_name");
+    std::string_view mount_point = rawText(volume, "mount_point");
     return (!bsd_name.empty() && bsd_names_.count(bsd_name)) ||
            (!mount_point.empty() && mount_points_.count(mount_point));
   }
 
   void remember(const Tag& volume) {
-    std::string bsd_name = rawText(volume, "bsd_name");
-    std::string mount_point = rawText(volume, "mount_point");
+    std::string_view bsd_name = rawText(volume, "bsd_name");
+    std::string_view mount_point = rawText(volume, "mount_point");
     if (!bsd_name.empty()) bsd_names_.insert(bsd_name);
     if (!mount_point.empty()) mount_points_.insert(mount_point);
   }
@@ -141,8 +141,9 @@ class StorageWriter {
   int disks_ = 0;
   int drives_ = 0;
   int volumes_ = 0;
-  std::set<std::string> bsd_names_;
-  std::set<std::string> mount_points_;
+  // Views into the raw tree, which outlives the section's building.
+  std::set<std::string_view> bsd_names_;
+  std::set<std::string_view> mount_points_;
 };
 
 const Tag* childItems(const Tag& tag) { return tag.findChild("_items"); }

@@ -105,7 +105,7 @@ void addPowerProfiles(Tag& top, const TagTree& raw) {
     for (size_t k = 0; k < profiles.size(); ++k) {
       const Tag& profile = *profiles[k];
       Tag& power = top.addChild("System").addChild("PowerManagement");
-      std::string label = profile.name() == "AC_Power" ? "AC Power" : profile.name();
+      std::string_view label = profile.name() == "AC_Power" ? "AC Power" : profile.name();
       Tag& record = power.setChildValue(formatText("Profile:%zu", k + 1), TagValue(label));
       for (const ProfileSetting& setting : kProfileSettings) {
         if (!setting.is_switch) {

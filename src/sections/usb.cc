@@ -198,7 +198,7 @@ class UsbWriter {
       } else if (key == "serial_num") {
         disk.setProperty("serial", value);
       } else if (key == "device_speed") {
-        const std::string& speed = value.text();
+        std::string_view speed = value.text();
         const char* code = speed == "full_speed" ? "1" : speed == "low_speed" ? "0" : "2";
         disk.setProperty("device-speed", TagValue(code));
       } else if (key == "manufacturer") {
@@ -234,11 +234,11 @@ class UsbWriter {
     }
   }
 
-  void writeMediaName(Tag& disk, const std::string& bsd_name) {
+  void writeMediaName(Tag& disk, std::string_view bsd_name) {
     // No name, nothing to ask diskutil about.
     if (bsd_name.empty()) return;
     std::string output =
-        runner_.run("diskutil info " + shellQuote("/dev/" + bsd_name), kDiskutilChunkSize);
+        runner_.run("diskutil info " + shellQuote("/dev/" + std::string(bsd_name)), kDiskutilChunkSize);
     if (std::optional<std::string> media = findMediaName(output)) {
       disk.setProperty("model", TagValue(*media));
     }
@@ -261,7 +261,7 @@ class UsbWriter {
     return true;
   }
 
-  static bool isMountedAlready(const Tag& logical, const std::string& mount_point) {
+  static bool isMountedAlready(const Tag& logical, std::string_view mount_point) {
     if (mount_point.empty()) return false;
     for (const auto& partition : logical.children()) {
       const TagProperty* known = partition->findProperty("mount-point");

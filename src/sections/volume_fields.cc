@@ -24,7 +24,7 @@ SizeReading readVolumeSize(const Tag& volume, std::string_view bytes_key,
     reading.bytes = bytes->asInt();
     reading.gigabytes = bytesToDecimalGigabytes(reading.bytes);
   } else {
-    std::string text = rawText(volume, text_key);
+    std::string_view text = rawText(volume, text_key);
     reading.gigabytes = SizeText::toDecimalGigabytes(text, false);
     reading.bytes = SizeText::toBytes(text);
   }

@@ -1,41 +1,158 @@
 #include "zxml/tag.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <cstdio>
 #include <cstring>
+#include <functional>
 #include <limits>
+#include <new>
+
+#include "zxml/arena.h"
 
 namespace cvn {
 
+// ---------------------------------------------------------------- TagStore
+
+// What every tag of one tree shares: the arena that holds them, and one copy
+// of each short name that the tree repeats. A raw tree of many applications
+// names the same seven keys in every item; remembering the last text seen in
+// each of a few hundred slots keeps one copy of each instead of one per item.
+class TagStore {
+ public:
+  Arena& arena() { return arena_; }
+
+  std::string_view name(std::string_view text) {
+    if (text.size() > kLongestShared) return arena_.copyText(text);
+    size_t slot = std::hash<std::string_view>()(text) & (kSlots - 1);
+    std::string_view& shared = names_[slot];
+    if (shared.data() && shared == text) return shared;
+    shared = arena_.copyText(text);
+    return shared;
+  }
+
+ private:
+  static constexpr size_t kLongestShared = 40;
+  static constexpr size_t kSlots = 512;
+  Arena arena_;
+  std::string_view names_[kSlots] = {};
+};
+
+template <typename T>
+void TagList<T>::push(TagStore& store, const T& item) {
+  if (size_ == capacity_) {
+    if (capacity_ == UINT32_MAX) throw std::bad_alloc();
+    uint32_t capacity = capacity_ == 0 ? 4 : capacity_ > UINT32_MAX / 2 ? UINT32_MAX : capacity_ * 2;
+    T* data = static_cast<T*>(store.arena().allocate(sizeof(T) * capacity, alignof(T)));
+    if (size_) std::memcpy(static_cast<void*>(data), data_, sizeof(T) * size_);
+    data_ = data;
+    capacity_ = capacity;
+  }
+  data_[size_++] = item;
+}
+
+template class TagList<Tag*>;
+template class TagList<TagProperty*>;
+template class TagList<Annotation>;
+
 // ---------------------------------------------------------------- TagValue
+
+TagValue::TagValue(std::string_view s) : int_(0) { assignText(s); }
+
+TagValue TagValue::viewOf(std::string_view text) {
+  TagValue value;
+  value.type_ = Type::kText;
+  value.size_ = static_cast<uint32_t>(std::min<size_t>(text.size(), UINT32_MAX));
+  value.storage_ = Storage::kElsewhere;
+  value.text_ = text.data();
+  return value;
+}
+
+TagValue::TagValue(const TagValue& other) : int_(0) { copyFrom(other); }
+
+TagValue::TagValue(TagValue&& other) noexcept : int_(0) {
+  std::memcpy(static_cast<void*>(this), &other, sizeof *this);
+  // The heap text changes hands; inline and borrowed texts were copied.
+  if (other.storage_ == Storage::kHeap) {
+    other.storage_ = Storage::kInline;
+    other.type_ = Type::kNone;
+    other.size_ = 0;
+  }
+}
 
 TagValue& TagValue::operator=(const TagValue& other) {
   // A source of type none is deliberately a no-op, not a clear.
   if (this == &other || other.type_ == Type::kNone) return *this;
+  if (other.isText()) {
+    // The text may be this value's own, so it is copied before letting go.
+    TagValue copy(other);
+    return *this = std::move(copy);
+  }
   clear();
-  type_ = other.type_;
-  int_ = other.int_;
-  real_ = other.real_;
-  text_ = other.text_;
+  copyFrom(other);
   return *this;
 }
 
-TagValue& TagValue::operator=(TagValue&& other) {
+TagValue& TagValue::operator=(TagValue&& other) noexcept {
   if (this == &other || other.type_ == Type::kNone) return *this;
-  clear();
-  type_ = other.type_;
-  int_ = other.int_;
-  real_ = other.real_;
-  text_ = std::move(other.text_);
+  releaseText();
+  std::memcpy(static_cast<void*>(this), &other, sizeof *this);
+  if (other.storage_ == Storage::kHeap) {
+    other.storage_ = Storage::kInline;
+    other.type_ = Type::kNone;
+    other.size_ = 0;
+  }
   return *this;
 }
 
 void TagValue::clear() {
+  releaseText();
   type_ = Type::kNone;
   int_ = 0;
-  real_ = 0.0;
-  std::string().swap(text_);
+  size_ = 0;
+}
+
+void TagValue::releaseText() {
+  if (storage_ == Storage::kHeap) delete[] text_;
+  storage_ = Storage::kInline;
+}
+
+void TagValue::assignText(std::string_view text) {
+  type_ = Type::kText;
+  size_ = static_cast<uint32_t>(std::min<size_t>(text.size(), UINT32_MAX));
+  if (size_ <= kInlineText) {
+    storage_ = Storage::kInline;
+    if (size_) std::memcpy(inline_, text.data(), size_);
+    inline_[size_] = '\0';
+    return;
+  }
+  char* copy = new char[size_ + 1];
+  std::memcpy(copy, text.data(), size_);
+  copy[size_] = '\0';
+  text_ = copy;
+  storage_ = Storage::kHeap;
+}
+
+void TagValue::copyFrom(const TagValue& other) {
+  if (other.isText()) {
+    assignText(other.text());
+    return;
+  }
+  type_ = other.type_;
+  storage_ = Storage::kInline;
+  size_ = 0;
+  int_ = other.int_;  // also carries a real's bits
+}
+
+TagValue TagValue::storedIn(const TagValue& value, TagStore& store) {
+  if (!value.isText() || value.size_ <= kInlineText) return TagValue(value);
+  TagValue stored;
+  stored.type_ = Type::kText;
+  stored.size_ = value.size_;
+  stored.storage_ = Storage::kElsewhere;
+  stored.text_ = store.arena().copyText(value.text()).data();
+  return stored;
 }
 
 namespace {
@@ -87,7 +204,7 @@ size_t TagValue::textLength() const {
     case Type::kReal:
       return formatNumber(*this, buf);
     case Type::kText:
-      return text_.size();
+      return size_;
   }
   return 0;
 }
@@ -109,10 +226,12 @@ size_t TagValue::writeText(char* out) const {
       out[n] = '\0';
       return n;
     }
-    case Type::kText:
-      std::memcpy(out, text_.data(), text_.size());
-      out[text_.size()] = '\0';
-      return text_.size();
+    case Type::kText: {
+      std::string_view t = text();
+      if (!t.empty()) std::memcpy(out, t.data(), t.size());
+      out[t.size()] = '\0';
+      return t.size();
+    }
   }
   return 0;
 }
@@ -139,25 +258,33 @@ bool TagValue::operator==(const TagValue& o) const {
     case Type::kReal:
       return real_ == o.real_;
     case Type::kText:
-      return text_ == o.text_;
+      return text() == o.text();
   }
   return false;
 }
 
 // ------------------------------------------------------------- TagProperty
 
-void TagProperty::addAnnotation(std::string key, std::string text) {
-  annotations_.push_back(Annotation{std::move(key), std::move(text)});
+TagProperty::TagProperty(TagStore& store, std::string_view name)
+    : store_(&store), name_(store.name(name)) {}
+
+void TagProperty::setValue(const TagValue& v) {
+  if (v.isNone()) return;
+  value_ = TagValue::storedIn(v, *store_);
+}
+
+void TagProperty::addAnnotation(std::string_view key, std::string_view text) {
+  annotations_.push(*store_, Annotation{store_->name(key), store_->name(text)});
 }
 
 void TagProperty::setAnnotation(std::string_view key, std::string_view text) {
-  for (Annotation& a : annotations_) {
-    if (a.key == key) {
-      a.text = std::string(text);
+  for (size_t i = 0; i < annotations_.size(); ++i) {
+    if (annotations_[i].key == key) {
+      annotations_.data_[i].text = store_->name(text);
       return;
     }
   }
-  annotations_.push_back(Annotation{std::string(key), std::string(text)});
+  addAnnotation(key, text);
 }
 
 const Annotation* TagProperty::findAnnotation(std::string_view key) const {
@@ -166,27 +293,96 @@ const Annotation* TagProperty::findAnnotation(std::string_view key) const {
   return nullptr;
 }
 
+// --------------------------------------------------------------- NameIndex
+
+namespace {
+
+// A first-match index over one list of named items: open addressing in the
+// tree's arena, each slot a position in the list (plus one; zero is empty)
+// beside 32 bits of the name's hash, so that a probe rarely has to look at
+// a name. Kept at most half full.
+class NameIndex {
+ public:
+  template <typename T>
+  void build(TagStore& store, const TagList<T*>& list) {
+    uint32_t slots = 64;
+    while (slots / 2 <= list.size()) slots *= 2;
+    slots_ = static_cast<uint64_t*>(store.arena().allocate(sizeof(uint64_t) * slots, 8));
+    std::memset(slots_, 0, sizeof(uint64_t) * slots);
+    mask_ = slots - 1;
+    count_ = 0;
+    for (size_t i = 0; i < list.size(); ++i) insert(store, list, i);
+  }
+
+  template <typename T>
+  T* find(const TagList<T*>& list, std::string_view name) const {
+    const size_t hash = std::hash<std::string_view>()(name);
+    const uint32_t tag = static_cast<uint32_t>(hash >> 32);
+    for (size_t at = hash & mask_;; at = (at + 1) & mask_) {
+      const uint64_t slot = slots_[at];
+      if (slot == 0) return nullptr;
+      if (static_cast<uint32_t>(slot >> 32) != tag) continue;
+      T* item = list[static_cast<uint32_t>(slot) - 1];
+      if (item->name() == name) return item;
+    }
+  }
+
+  /// Indexes the item at `position`, unless an earlier one has its name.
+  template <typename T>
+  void insert(TagStore& store, const TagList<T*>& list, size_t position) {
+    if ((count_ + 1) * 2 > mask_ + 1) {
+      build(store, list);  // the new item is in the list already
+      return;
+    }
+    std::string_view name = list[position]->name();
+    const size_t hash = std::hash<std::string_view>()(name);
+    const uint32_t tag = static_cast<uint32_t>(hash >> 32);
+    size_t at = hash & mask_;
+    for (;; at = (at + 1) & mask_) {
+      const uint64_t slot = slots_[at];
+      if (slot == 0) break;
+      if (static_cast<uint32_t>(slot >> 32) == tag &&
+          list[static_cast<uint32_t>(slot) - 1]->name() == name)
+        return;
+    }
+    slots_[at] = (uint64_t{tag} << 32) | static_cast<uint64_t>(position + 1);
+    ++count_;
+  }
+
+ private:
+  uint64_t* slots_ = nullptr;
+  uint32_t mask_ = 0;
+  uint32_t count_ = 0;
+};
+
+// Below this many entries a list is searched from the front.
+constexpr size_t kIndexThreshold = 16;
+
+}  // namespace
+
+struct Tag::Indexes {
+  NameIndex children;
+  NameIndex properties;
+  bool has_children = false;
+  bool has_properties = false;
+};
+
 // --------------------------------------------------------------------- Tag
 
-Tag::Tag(Kind kind, std::string name) : kind_(kind), name_(std::move(name)) {}
+Tag::Tag(TagStore& store, Kind kind, std::string_view name)
+    : store_(&store), name_(store.arena().copyText(name)), kind_(kind) {}
 
 Tag* Tag::findChild(std::string_view name) const {
-  if (child_index_) {
-    auto it = child_index_->find(name);
-    return it == child_index_->end() ? nullptr : it->second;
-  }
-  for (const auto& c : children_)
-    if (c->name_ == name) return c.get();
+  if (indexes_ && indexes_->has_children) return indexes_->children.find(children_, name);
+  for (Tag* c : children_)
+    if (c->name_ == name) return c;
   return nullptr;
 }
 
 TagProperty* Tag::findProperty(std::string_view name) const {
-  if (property_index_) {
-    auto it = property_index_->find(name);
-    return it == property_index_->end() ? nullptr : it->second;
-  }
-  for (const auto& p : properties_)
-    if (p->name() == name) return p.get();
+  if (indexes_ && indexes_->has_properties) return indexes_->properties.find(properties_, name);
+  for (TagProperty* p : properties_)
+    if (p->name() == name) return p;
   return nullptr;
 }
 
@@ -196,13 +392,14 @@ void Tag::makeBranch() {
 
 Tag& Tag::appendChild(std::string_view name) {
   makeBranch();
-  children_.push_back(std::make_unique<Tag>(Kind::kLeaf, std::string(name)));
-  Tag* child = children_.back().get();
-  if (child_index_) {
-    child_index_->emplace(child->name_, child);  // keeps the first match
+  Tag* child = store_->arena().make<Tag>(*store_, Kind::kLeaf, name);
+  children_.push(*store_, child);
+  if (indexes_ && indexes_->has_children) {
+    indexes_->children.insert(*store_, children_, children_.size() - 1);
   } else if (children_.size() > kIndexThreshold) {
-    child_index_ = std::make_unique<std::unordered_map<std::string_view, Tag*>>();
-    for (const auto& c : children_) child_index_->emplace(c->name_, c.get());
+    if (!indexes_) indexes_ = store_->arena().make<Indexes>();
+    indexes_->children.build(*store_, children_);
+    indexes_->has_children = true;
   }
   return *child;
 }
@@ -229,22 +426,23 @@ Tag& Tag::setChildValue(std::string_view name, const TagValue& value) {
 
 void Tag::setValue(const TagValue& value) {
   if (!value_) {
-    value_ = std::make_unique<TagValue>(value);
-  } else {
-    *value_ = value;
+    value_ = store_->arena().make<TagValue>(TagValue::storedIn(value, *store_));
+  } else if (!value.isNone()) {
+    *value_ = TagValue::storedIn(value, *store_);
   }
 }
 
 TagProperty& Tag::appendProperty(std::string_view name) {
-  properties_.push_back(std::make_unique<TagProperty>(std::string(name)));
-  TagProperty& prop = *properties_.back();
-  if (property_index_) {
-    property_index_->emplace(prop.name(), &prop);
+  TagProperty* prop = store_->arena().make<TagProperty>(*store_, name);
+  properties_.push(*store_, prop);
+  if (indexes_ && indexes_->has_properties) {
+    indexes_->properties.insert(*store_, properties_, properties_.size() - 1);
   } else if (properties_.size() > kIndexThreshold) {
-    property_index_ = std::make_unique<std::unordered_map<std::string_view, TagProperty*>>();
-    for (const auto& p : properties_) property_index_->emplace(p->name(), p.get());
+    if (!indexes_) indexes_ = store_->arena().make<Indexes>();
+    indexes_->properties.build(*store_, properties_);
+    indexes_->has_properties = true;
   }
-  return prop;
+  return *prop;
 }
 
 TagProperty& Tag::setProperty(std::string_view name, const TagValue& value, const char* note_key,
@@ -259,15 +457,8 @@ TagProperty& Tag::setProperty(std::string_view name, const TagValue& value, cons
   return prop;
 }
 
-TagProperty& Tag::setProperty(std::string_view name, TagValue&& value) {
-  TagProperty* prop = findProperty(name);
-  if (!prop) prop = &appendProperty(name);
-  prop->setValue(std::move(value));
-  return *prop;
-}
-
-void Tag::addAnnotation(std::string key, std::string text) {
-  annotations_.push_back(Annotation{std::move(key), std::move(text)});
+void Tag::addAnnotation(std::string_view key, std::string_view text) {
+  annotations_.push(*store_, Annotation{store_->name(key), store_->name(text)});
 }
 
 std::string Tag::nextNumberedName(std::string_view base) const {
@@ -308,7 +499,7 @@ TagProperty& Tag::setPropertyByPath(std::string_view path, const TagValue& value
   return *prop;
 }
 
-void Tag::annotateByPath(std::string_view path, const std::string& key, const std::string& text) {
+void Tag::annotateByPath(std::string_view path, std::string_view key, std::string_view text) {
   Tag* current = this;
   for (;;) {
     if (!path.empty() && path.front() == '/') {
@@ -329,8 +520,8 @@ void Tag::annotateByPath(std::string_view path, const std::string& key, const st
   }
 }
 
-void Tag::annotatePropertyByPath(std::string_view path, const std::string& key,
-                                 const std::string& text) {
+void Tag::annotatePropertyByPath(std::string_view path, std::string_view key,
+                                 std::string_view text) {
   Tag* current = this;
   if (!path.empty() && path.front() == '/') {
     path.remove_prefix(1);
@@ -349,22 +540,24 @@ void Tag::annotatePropertyByPath(std::string_view path, const std::string& key,
 void Tag::copyFrom(const Tag& other) {
   if (this == &other) return;
   kind_ = other.kind_;
-  // A parent's index views this name's bytes, so an equal name is left
-  // alone; a different one is only allowed on a tag no parent lists.
-  if (name_ != other.name_) name_ = other.name_;
-  value_ = other.value_ ? std::make_unique<TagValue>(*other.value_) : nullptr;
-  annotations_ = other.annotations_;
+  // A parent's index reads this name, so an equal name is left alone; a
+  // different one is only allowed on a tag no parent lists.
+  if (name_ != other.name_) name_ = store_->arena().copyText(other.name_);
+  value_ = nullptr;
+  if (other.value_) setValue(*other.value_);
+  annotations_.clear();
+  for (const Annotation& a : other.annotations_) addAnnotation(a.key, a.text);
+  // The old entries stay in the arena, unlisted; duplicate names are legal
+  // in the copy, so properties and children are appended, not looked up.
   properties_.clear();
-  property_index_.reset();
-  for (const auto& p : other.properties_) {
-    TagProperty& prop = setProperty(p->name(), TagValue());
-    prop.value() = p->value();
+  children_.clear();
+  if (indexes_) indexes_->has_children = indexes_->has_properties = false;
+  for (const TagProperty* p : other.properties_) {
+    TagProperty& prop = appendProperty(p->name());
+    prop.setValue(p->value());
     for (const Annotation& a : p->annotations()) prop.addAnnotation(a.key, a.text);
   }
-  children_.clear();
-  child_index_.reset();
-  for (const auto& c : other.children_) appendCopyOf(*c);
-  // Duplicate names are legal: appending copies, not setProperty, keeps them.
+  for (const Tag* c : other.children_) appendCopyOf(*c);
 }
 
 Tag& Tag::appendCopyOf(const Tag& other) {
@@ -376,17 +569,21 @@ Tag& Tag::appendCopyOf(const Tag& other) {
 // ----------------------------------------------------------------- TagTree
 
 TagTree::TagTree(bool native_byte_order, std::string_view top_name)
-    : native_byte_order_(native_byte_order),
-      document_(std::make_unique<Tag>(Tag::Kind::kDocument, std::string())) {
+    : native_byte_order_(native_byte_order), store_(std::make_unique<TagStore>()) {
+  document_ = store_->arena().make<Tag>(*store_, Tag::Kind::kDocument, std::string_view());
   // The top tag starts as a leaf; it becomes a branch with its first child.
   document_->addChild(top_name);
 }
 
 TagTree::TagTree(const TagTree& other)
-    : native_byte_order_(other.native_byte_order_),
-      document_(std::make_unique<Tag>(Tag::Kind::kDocument, std::string())) {
+    : native_byte_order_(other.native_byte_order_), store_(std::make_unique<TagStore>()) {
+  document_ = store_->arena().make<Tag>(*store_, Tag::Kind::kDocument, std::string_view());
   document_->copyFrom(*other.document_);
 }
+
+// Tags and their values live in the arena and free nothing of their own:
+// dropping the store drops the whole tree.
+TagTree::~TagTree() = default;
 
 TagProperty& TagTree::setValue(std::string_view path, const TagValue& value, const char* note_key,
                                const char* note_text) {

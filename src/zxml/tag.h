@@ -11,35 +11,42 @@
 #include <string>
 #include <string_view>
 #include <type_traits>
-#include <unordered_map>
 #include <vector>
 
 namespace cvn {
 
+class TagStore;
+
 /// A small tagged union: none, boolean, signed 64-bit integer, double or
-/// owned text. Copied by value.
+/// text. A value on its own owns its text (short texts sit inside it); a
+/// value stored in a tree keeps its text in the tree's arena.
 class TagValue {
  public:
   enum class Type : uint8_t { kNone = 0, kBool = 1, kInt = 2, kReal = 3, kText = 4 };
 
-  TagValue() = default;
-  explicit TagValue(bool b) : type_(Type::kBool), int_(b ? 1 : 0) {}
+  TagValue() : int_(0) {}
+  explicit TagValue(bool b) : int_(b ? 1 : 0), type_(Type::kBool) {}
   template <typename T, std::enable_if_t<std::is_integral_v<T> && !std::is_same_v<T, bool> &&
                                              !std::is_same_v<T, char>,
                                          int> = 0>
-  TagValue(T i) : type_(Type::kInt), int_(static_cast<int64_t>(i)) {}
-  TagValue(double d) : type_(Type::kReal), real_(d) {}
+  TagValue(T i) : int_(static_cast<int64_t>(i)), type_(Type::kInt) {}
+  TagValue(double d) : real_(d), type_(Type::kReal) {}
   /// A null pointer gives the empty text (type text, not none).
-  TagValue(const char* s) : type_(Type::kText), text_(s ? s : "") {}
-  TagValue(std::string s) : type_(Type::kText), text_(std::move(s)) {}
-  TagValue(std::string_view s) : type_(Type::kText), text_(s) {}
+  TagValue(const char* s) : TagValue(std::string_view(s ? s : "")) {}
+  TagValue(const std::string& s) : TagValue(std::string_view(s)) {}
+  TagValue(std::string_view s);
+  /// A text value that only refers to `text`, for handing a text straight
+  /// to a setter without copying it first: it must not outlive `text`.
+  /// Copies of it own their text.
+  static TagValue viewOf(std::string_view text);
 
-  TagValue(const TagValue&) = default;
-  TagValue(TagValue&&) = default;
+  TagValue(const TagValue& other);
+  TagValue(TagValue&& other) noexcept;
   /// Assignment from a value of type none leaves this value untouched; only
   /// clear() empties a value.
   TagValue& operator=(const TagValue& other);
-  TagValue& operator=(TagValue&& other);
+  TagValue& operator=(TagValue&& other) noexcept;
+  ~TagValue() { releaseText(); }
 
   void clear();
 
@@ -50,11 +57,14 @@ class TagValue {
   bool isReal() const { return type_ == Type::kReal; }
   bool isBool() const { return type_ == Type::kBool; }
 
-  bool asBool() const { return int_ != 0; }
-  int64_t asInt() const { return int_; }
-  double asReal() const { return real_; }
+  bool asBool() const { return (isBool() || isInt()) && int_ != 0; }
+  int64_t asInt() const { return isBool() || isInt() ? int_ : 0; }
+  double asReal() const { return isReal() ? real_ : 0.0; }
   /// The stored text; empty for any other type.
-  const std::string& text() const { return text_; }
+  std::string_view text() const {
+    if (!isText()) return std::string_view();
+    return std::string_view(storage_ == Storage::kInline ? inline_ : text_, size_);
+  }
 
   /// Length of textForm() without formatting it into a string.
   size_t textLength() const;
@@ -69,64 +79,115 @@ class TagValue {
   bool operator!=(const TagValue& other) const { return !(*this == other); }
 
  private:
+  friend class Tag;
+  friend class TagProperty;
+
+  // Where a text lives: inside the value, on the heap (owned), or elsewhere
+  // (a tree's arena, or the caller's text for viewOf).
+  enum class Storage : uint8_t { kInline, kHeap, kElsewhere };
+  static constexpr size_t kInlineText = 15;
+
+  /// The copy a tree stores: its text, unless short, copied into `store`.
+  static TagValue storedIn(const TagValue& value, TagStore& store);
+  void assignText(std::string_view text);
+  void copyFrom(const TagValue& other);
+  void releaseText();
+
+  union {
+    int64_t int_;
+    double real_;
+    const char* text_;
+    char inline_[kInlineText + 1];
+  };
+  // Texts are cut at 4 GiB - 1 bytes; nothing collected comes near.
+  uint32_t size_ = 0;
   Type type_ = Type::kNone;
-  int64_t int_ = 0;
-  double real_ = 0.0;
-  std::string text_;
+  Storage storage_ = Storage::kInline;
 };
 
+/// A key and a text, both kept by the tree.
 struct Annotation {
-  std::string key;
-  std::string text;
+  std::string_view key;
+  std::string_view text;
   bool operator==(const Annotation& o) const { return key == o.key && text == o.text; }
+};
+
+/// An ordered list inside a tree's arena, read like a vector. Growing leaves
+/// the old room behind in the arena, so the total stays within twice the
+/// final size.
+template <typename T>
+class TagList {
+  static_assert(std::is_trivially_copyable_v<T>, "a tree's lists hold plain items");
+
+ public:
+  const T* begin() const { return data_; }
+  const T* end() const { return data_ + size_; }
+  size_t size() const { return size_; }
+  bool empty() const { return size_ == 0; }
+  const T& operator[](size_t i) const { return data_[i]; }
+  const T& front() const { return data_[0]; }
+  const T& back() const { return data_[size_ - 1]; }
+
+ private:
+  friend class Tag;
+  friend class TagProperty;
+  void push(TagStore& store, const T& item);
+  void clear() { size_ = 0; }
+
+  T* data_ = nullptr;
+  uint32_t size_ = 0;
+  uint32_t capacity_ = 0;
 };
 
 /// A named leaf datum owned by a tag.
 class TagProperty {
  public:
-  explicit TagProperty(std::string name) : name_(std::move(name)) {}
+  TagProperty(TagStore& store, std::string_view name);
+  TagProperty(const TagProperty&) = delete;
+  TagProperty& operator=(const TagProperty&) = delete;
 
-  const std::string& name() const { return name_; }
+  std::string_view name() const { return name_; }
   const TagValue& value() const { return value_; }
-  TagValue& value() { return value_; }
-  const std::vector<Annotation>& annotations() const { return annotations_; }
+  const TagList<Annotation>& annotations() const { return annotations_; }
 
-  void setValue(const TagValue& v) { value_ = v; }
-  void setValue(TagValue&& v) { value_ = std::move(v); }
-  void addAnnotation(std::string key, std::string text);
+  /// Replaces the value with a copy (a value of type none changes nothing).
+  void setValue(const TagValue& v);
+  void addAnnotation(std::string_view key, std::string_view text);
   /// Replaces the text of the first annotation with `key`, or appends one.
   void setAnnotation(std::string_view key, std::string_view text);
   const Annotation* findAnnotation(std::string_view key) const;
 
  private:
-  std::string name_;
+  TagStore* store_;
+  std::string_view name_;
   TagValue value_;
-  std::vector<Annotation> annotations_;
+  TagList<Annotation> annotations_;
 };
 
 /// Lookups by name are linear in meaning (the first match wins, duplicates
 /// are possible); large lists keep a first-match index so that big sections
-/// stay linear to build.
+/// stay linear to build. Tags live in their tree's arena and are made by the
+/// tree and by their parents, never on their own.
 class Tag {
  public:
   enum class Kind : uint32_t { kDocument = 0, kLeaf = 1, kBranch = 2 };
 
-  Tag(Kind kind, std::string name);
+  Tag(TagStore& store, Kind kind, std::string_view name);
   Tag(const Tag&) = delete;
   Tag& operator=(const Tag&) = delete;
 
   Kind kind() const { return kind_; }
-  const std::string& name() const { return name_; }
+  std::string_view name() const { return name_; }
   /// Null when the tag has no value (dumped as an empty value).
-  const TagValue* value() const { return value_.get(); }
-  const std::vector<std::unique_ptr<Tag>>& children() const { return children_; }
-  const std::vector<std::unique_ptr<TagProperty>>& properties() const { return properties_; }
-  const std::vector<Annotation>& annotations() const { return annotations_; }
+  const TagValue* value() const { return value_; }
+  const TagList<Tag*>& children() const { return children_; }
+  const TagList<TagProperty*>& properties() const { return properties_; }
+  const TagList<Annotation>& annotations() const { return annotations_; }
 
   Tag* findChild(std::string_view name) const;
   TagProperty* findProperty(std::string_view name) const;
   /// First child, or null.
-  Tag* firstChild() const { return children_.empty() ? nullptr : children_.front().get(); }
+  Tag* firstChild() const { return children_.empty() ? nullptr : children_.front(); }
 
   /// Get-or-add: the existing child of that name, else a new leaf child.
   Tag& addChild(std::string_view name);
@@ -140,9 +201,7 @@ class Tag {
   /// carries the annotation (note_key, note_text) when both are non-null.
   TagProperty& setProperty(std::string_view name, const TagValue& value,
                            const char* note_key = nullptr, const char* note_text = nullptr);
-  /// The same, taking the value over instead of copying it.
-  TagProperty& setProperty(std::string_view name, TagValue&& value);
-  void addAnnotation(std::string key, std::string text);
+  void addAnnotation(std::string_view key, std::string_view text);
   /// The first "<base><N>" for N = 1, 2, ... that no child bears.
   std::string nextNumberedName(std::string_view base) const;
 
@@ -155,11 +214,10 @@ class Tag {
   /// Annotates the tag named by `path`. Creates nothing. After each
   /// intermediate segment the walk continues in that child's *first child*
   /// ("a/b" annotates the b found under the first child of a).
-  void annotateByPath(std::string_view path, const std::string& key, const std::string& text);
+  void annotateByPath(std::string_view path, std::string_view key, std::string_view text);
   /// Annotates the first property named by the last segment; intermediate
   /// segments are children. Creates nothing.
-  void annotatePropertyByPath(std::string_view path, const std::string& key,
-                              const std::string& text);
+  void annotatePropertyByPath(std::string_view path, std::string_view key, std::string_view text);
 
   /// Deep copy of `other` into this tag: kind, name, value, annotations,
   /// then every property and every child, in order. Replaces what this tag
@@ -171,26 +229,23 @@ class Tag {
   Tag& appendCopyOf(const Tag& other);
 
  private:
-  static constexpr size_t kIndexThreshold = 16;
+  struct Indexes;
 
   Tag& appendChild(std::string_view name);
+  TagProperty& appendProperty(std::string_view name);
   void makeBranch();
   Tag* stepInto(std::string_view segment, bool create);
 
+  TagStore* store_;
+  std::string_view name_;
+  TagValue* value_ = nullptr;
+  TagList<Tag*> children_;
+  TagList<TagProperty*> properties_;
+  TagList<Annotation> annotations_;
+  // First-match indexes, made once a list grows past a handful of entries;
+  // most tags never need one.
+  Indexes* indexes_ = nullptr;
   Kind kind_;
-  std::string name_;
-  std::unique_ptr<TagValue> value_;
-  std::vector<std::unique_ptr<Tag>> children_;
-  std::vector<std::unique_ptr<TagProperty>> properties_;
-  std::vector<Annotation> annotations_;
-  TagProperty& appendProperty(std::string_view name);
-
-  // First-match indexes, built once a list grows past kIndexThreshold; most
-  // tags never need one, so they cost a pointer until then. The keys view
-  // the names the children and properties own: those live on the heap and
-  // keep their names, so a lookup or an insert copies no text.
-  std::unique_ptr<std::unordered_map<std::string_view, Tag*>> child_index_;
-  std::unique_ptr<std::unordered_map<std::string_view, TagProperty*>> property_index_;
 };
 
 /// Names for the flags of dumpText, serialise and SnapshotFile::addTree, so
@@ -212,6 +267,7 @@ class TagTree {
   TagTree(bool native_byte_order, std::string_view top_name);
   TagTree(const TagTree& other);
   TagTree& operator=(const TagTree&) = delete;
+  ~TagTree();
 
   Tag& document() { return *document_; }
   const Tag& document() const { return *document_; }
@@ -235,7 +291,8 @@ class TagTree {
 
  private:
   bool native_byte_order_;
-  std::unique_ptr<Tag> document_;
+  std::unique_ptr<TagStore> store_;
+  Tag* document_;
 };
 
 }  // namespace cvn

@@ -131,14 +131,14 @@ inline size_t valueLength(const TagValue& v) {
   return v.isText() ? std::min(v.text().size(), kMaxZxmlText) : v.isNone() ? 0 : v.textLength();
 }
 
-inline size_t nameLength(const std::string& s) { return std::min(s.size(), kMaxZxmlText); }
+inline size_t nameLength(std::string_view s) { return std::min(s.size(), kMaxZxmlText); }
 
 inline char* writeValue(char* out, const TagValue& v) {
   if (v.isText()) return out + writeText(out, v.text(), ZxmlField::kValue);
   return v.isNone() ? out : out + v.writeText(out);
 }
 
-size_t measureAnnotations(const std::vector<Annotation>& annotations) {
+size_t measureAnnotations(const TagList<Annotation>& annotations) {
   size_t size = 0;
   for (const Annotation& a : annotations)
     size += nameLength(a.key) + nameLength(a.text) + 3;  // ~ = \n
@@ -156,11 +156,11 @@ size_t measureTag(const Tag& tag) {
   return size;
 }
 
-inline char* writeName(char* out, const std::string& s) {
+inline char* writeName(char* out, std::string_view s) {
   return out + writeText(out, s, ZxmlField::kName);
 }
 
-char* writeAnnotations(char* out, const std::vector<Annotation>& annotations) {
+char* writeAnnotations(char* out, const TagList<Annotation>& annotations) {
   for (const Annotation& a : annotations) {
     *out++ = '~';
     out = writeName(out, a.key);
