@@ -34,12 +34,12 @@ class ToolsPrint : public cvn::FakeCommandRunner {
   std::string text_;
 };
 
-bool same(const std::string& read, const std::string& written, cvn::ZxmlField field) {
+bool same(const std::string& read, std::string_view written, cvn::ZxmlField field) {
   return read == cvn::zxmlText(written, field);
 }
 
 bool sameAnnotations(const std::vector<cvn::QaxAnnotation>& read,
-                     const std::vector<cvn::Annotation>& written) {
+                     const cvn::TagList<cvn::Annotation>& written) {
   if (read.size() != written.size()) return false;
   for (size_t i = 0; i < read.size(); ++i)
     if (!same(read[i].key, written[i].key, cvn::ZxmlField::kName) ||

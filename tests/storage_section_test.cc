@@ -107,9 +107,9 @@ TEST(StorageSectionTest, SizeRoundingAndUsedShare) {
     const TagProperty* size = storage->firstChild()->firstChild()->findProperty("size");
     const TagProperty* used =
         storage->findChild("Logical-disks")->firstChild()->findProperty("used%");
-    std::string text =
-        size ? size->value().textForm() + "/" + std::string(size->findAnnotation("base-value")->text)
-             : "-";
+    std::string text = size ? size->value().textForm() + "/" +
+                                  std::string(size->findAnnotation("base-value")->text)
+                            : "-";
     EXPECT_EQ(text + " " + (used ? used->value().textForm() : "-"), c.expected) << c.expected;
   }
 }

@@ -237,8 +237,8 @@ class UsbWriter {
   void writeMediaName(Tag& disk, std::string_view bsd_name) {
     // No name, nothing to ask diskutil about.
     if (bsd_name.empty()) return;
-    std::string output =
-        runner_.run("diskutil info " + shellQuote("/dev/" + std::string(bsd_name)), kDiskutilChunkSize);
+    std::string output = runner_.run("diskutil info " + shellQuote("/dev/" + std::string(bsd_name)),
+                                     kDiskutilChunkSize);
     if (std::optional<std::string> media = findMediaName(output)) {
       disk.setProperty("model", TagValue(*media));
     }

@@ -23,27 +23,51 @@ class TagStore {
  public:
   Arena& arena() { return arena_; }
 
-  std::string_view name(std::string_view text) {
-    if (text.size() > kLongestShared) return arena_.copyText(text);
+  /// A copy of `text`, shared with an earlier equal one when it is short.
+  std::string_view text(std::string_view text) { return name(text).view(); }
+
+  TagName name(std::string_view text) {
+    if (text.size() > kLongestShared) return copy(text);
     size_t slot = std::hash<std::string_view>()(text) & (kSlots - 1);
-    std::string_view& shared = names_[slot];
-    if (shared.data() && shared == text) return shared;
-    shared = arena_.copyText(text);
+    TagName& shared = names_[slot];
+    if (shared_[slot] && shared.view() == text) return shared;
+    shared = copy(text);
+    shared_[slot] = true;
     return shared;
   }
+
+  TagList<Annotation>* newAnnotationList() { return arena_.make<TagList<Annotation>>(); }
 
  private:
   static constexpr size_t kLongestShared = 40;
   static constexpr size_t kSlots = 512;
+
+  TagName copy(std::string_view text) {
+    if (text.size() > UINT32_MAX - 1) text = text.substr(0, UINT32_MAX - 1);
+    const uint32_t size = static_cast<uint32_t>(text.size());
+    char* bytes = static_cast<char*>(arena_.allocate(sizeof size + size + 1, alignof(uint32_t)));
+    std::memcpy(bytes, &size, sizeof size);
+    if (size) std::memcpy(bytes + sizeof size, text.data(), size);
+    bytes[sizeof size + size] = '\0';
+    return TagName(bytes + sizeof size);
+  }
+
   Arena arena_;
-  std::string_view names_[kSlots] = {};
+  TagName names_[kSlots];
+  bool shared_[kSlots] = {};
 };
+
+namespace {
+const TagList<Annotation> kNoAnnotations;
+}  // namespace
 
 template <typename T>
 void TagList<T>::push(TagStore& store, const T& item) {
   if (size_ == capacity_) {
     if (capacity_ == UINT32_MAX) throw std::bad_alloc();
-    uint32_t capacity = capacity_ == 0 ? 4 : capacity_ > UINT32_MAX / 2 ? UINT32_MAX : capacity_ * 2;
+    uint32_t capacity = capacity_ == 0               ? 4
+                        : capacity_ > UINT32_MAX / 2 ? UINT32_MAX
+                                                     : capacity_ * 2;
     T* data = static_cast<T*>(store.arena().allocate(sizeof(T) * capacity, alignof(T)));
     if (size_) std::memcpy(static_cast<void*>(data), data_, sizeof(T) * size_);
     data_ = data;
@@ -268,27 +292,34 @@ bool TagValue::operator==(const TagValue& o) const {
 TagProperty::TagProperty(TagStore& store, std::string_view name)
     : store_(&store), name_(store.name(name)) {}
 
+const TagList<Annotation>& TagProperty::annotations() const {
+  return annotations_ ? *annotations_ : kNoAnnotations;
+}
+
 void TagProperty::setValue(const TagValue& v) {
   if (v.isNone()) return;
   value_ = TagValue::storedIn(v, *store_);
 }
 
 void TagProperty::addAnnotation(std::string_view key, std::string_view text) {
-  annotations_.push(*store_, Annotation{store_->name(key), store_->name(text)});
+  if (!annotations_) annotations_ = store_->newAnnotationList();
+  annotations_->push(*store_, Annotation{store_->text(key), store_->text(text)});
 }
 
 void TagProperty::setAnnotation(std::string_view key, std::string_view text) {
-  for (size_t i = 0; i < annotations_.size(); ++i) {
-    if (annotations_[i].key == key) {
-      annotations_.data_[i].text = store_->name(text);
-      return;
+  if (annotations_) {
+    for (size_t i = 0; i < annotations_->size(); ++i) {
+      if ((*annotations_)[i].key == key) {
+        annotations_->data_[i].text = store_->text(text);
+        return;
+      }
     }
   }
   addAnnotation(key, text);
 }
 
 const Annotation* TagProperty::findAnnotation(std::string_view key) const {
-  for (const Annotation& a : annotations_)
+  for (const Annotation& a : annotations())
     if (a.key == key) return &a;
   return nullptr;
 }
@@ -370,12 +401,16 @@ struct Tag::Indexes {
 // --------------------------------------------------------------------- Tag
 
 Tag::Tag(TagStore& store, Kind kind, std::string_view name)
-    : store_(&store), name_(store.arena().copyText(name)), kind_(kind) {}
+    : store_(&store), name_(store.name(name)), kind_(kind) {}
+
+const TagList<Annotation>& Tag::annotations() const {
+  return annotations_ ? *annotations_ : kNoAnnotations;
+}
 
 Tag* Tag::findChild(std::string_view name) const {
   if (indexes_ && indexes_->has_children) return indexes_->children.find(children_, name);
   for (Tag* c : children_)
-    if (c->name_ == name) return c;
+    if (c->name() == name) return c;
   return nullptr;
 }
 
@@ -458,7 +493,8 @@ TagProperty& Tag::setProperty(std::string_view name, const TagValue& value, cons
 }
 
 void Tag::addAnnotation(std::string_view key, std::string_view text) {
-  annotations_.push(*store_, Annotation{store_->name(key), store_->name(text)});
+  if (!annotations_) annotations_ = store_->newAnnotationList();
+  annotations_->push(*store_, Annotation{store_->text(key), store_->text(text)});
 }
 
 std::string Tag::nextNumberedName(std::string_view base) const {
@@ -542,11 +578,11 @@ void Tag::copyFrom(const Tag& other) {
   kind_ = other.kind_;
   // A parent's index reads this name, so an equal name is left alone; a
   // different one is only allowed on a tag no parent lists.
-  if (name_ != other.name_) name_ = store_->arena().copyText(other.name_);
+  if (name() != other.name()) name_ = store_->name(other.name());
   value_ = nullptr;
   if (other.value_) setValue(*other.value_);
-  annotations_.clear();
-  for (const Annotation& a : other.annotations_) addAnnotation(a.key, a.text);
+  if (annotations_) annotations_->clear();
+  for (const Annotation& a : other.annotations()) addAnnotation(a.key, a.text);
   // The old entries stay in the arena, unlisted; duplicate names are legal
   // in the copy, so properties and children are appended, not looked up.
   properties_.clear();
@@ -561,7 +597,7 @@ void Tag::copyFrom(const Tag& other) {
 }
 
 Tag& Tag::appendCopyOf(const Tag& other) {
-  Tag& child = appendChild(other.name_);
+  Tag& child = appendChild(other.name());
   child.copyFrom(other);
   return child;
 }

@@ -7,6 +7,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -139,6 +140,23 @@ class TagList {
   uint32_t capacity_ = 0;
 };
 
+/// A name kept by a tree: a pointer to its bytes, with the length in the
+/// four bytes before them, so that the millions of names of a large tree
+/// take one word each.
+class TagName {
+ public:
+  TagName() = default;
+  explicit TagName(const char* counted) : bytes_(counted) {}
+  std::string_view view() const {
+    uint32_t size;
+    std::memcpy(&size, bytes_ - sizeof size, sizeof size);
+    return std::string_view(bytes_, size);
+  }
+
+ private:
+  const char* bytes_ = nullptr;
+};
+
 /// A named leaf datum owned by a tag.
 class TagProperty {
  public:
@@ -146,9 +164,9 @@ class TagProperty {
   TagProperty(const TagProperty&) = delete;
   TagProperty& operator=(const TagProperty&) = delete;
 
-  std::string_view name() const { return name_; }
+  std::string_view name() const { return name_.view(); }
   const TagValue& value() const { return value_; }
-  const TagList<Annotation>& annotations() const { return annotations_; }
+  const TagList<Annotation>& annotations() const;
 
   /// Replaces the value with a copy (a value of type none changes nothing).
   void setValue(const TagValue& v);
@@ -159,9 +177,10 @@ class TagProperty {
 
  private:
   TagStore* store_;
-  std::string_view name_;
+  TagName name_;
   TagValue value_;
-  TagList<Annotation> annotations_;
+  // Most properties have none; the list is made with the first.
+  TagList<Annotation>* annotations_ = nullptr;
 };
 
 /// Lookups by name are linear in meaning (the first match wins, duplicates
@@ -177,12 +196,12 @@ class Tag {
   Tag& operator=(const Tag&) = delete;
 
   Kind kind() const { return kind_; }
-  std::string_view name() const { return name_; }
+  std::string_view name() const { return name_.view(); }
   /// Null when the tag has no value (dumped as an empty value).
   const TagValue* value() const { return value_; }
   const TagList<Tag*>& children() const { return children_; }
   const TagList<TagProperty*>& properties() const { return properties_; }
-  const TagList<Annotation>& annotations() const { return annotations_; }
+  const TagList<Annotation>& annotations() const;
 
   Tag* findChild(std::string_view name) const;
   TagProperty* findProperty(std::string_view name) const;
@@ -237,11 +256,11 @@ class Tag {
   Tag* stepInto(std::string_view segment, bool create);
 
   TagStore* store_;
-  std::string_view name_;
+  TagName name_;
   TagValue* value_ = nullptr;
   TagList<Tag*> children_;
   TagList<TagProperty*> properties_;
-  TagList<Annotation> annotations_;
+  TagList<Annotation>* annotations_ = nullptr;
   // First-match indexes, made once a list grows past a handful of entries;
   // most tags never need one.
   Indexes* indexes_ = nullptr;
