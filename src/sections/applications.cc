@@ -18,7 +18,7 @@ void writeApplication(Tag& software, const Tag& item) {
     record_name += ' ';
     record_name += rawText(item, "version");
   }
-  Tag& app = software.setChildValue(record_name, TagValue(name));
+  Tag& app = software.setChildValue(record_name, TagValue::viewOf(name));
 
   copyFieldIfPresent(app, "version", item, "version");
   if (hasKey(item, "app_store"))
