@@ -2,6 +2,14 @@
 
 #include <gtest/gtest.h>
 
+#include <signal.h>
+#include <sys/wait.h>
+#include <unistd.h>
+#if defined(__linux__)
+#include <sys/prctl.h>
+#endif
+
+#include <algorithm>
 #include <cinttypes>
 #include <cstdio>
 
@@ -184,6 +192,47 @@ TEST(ProcessCollectorTest, AnUnreadableTableLeavesNoSectionAndRunsNoPs) {
   collectProcesses(raw, table, runner);
   EXPECT_EQ(raw.top().findChild("Processes"), nullptr);
   EXPECT_TRUE(runner.commands_ran_.empty());
+}
+
+// The machine's own table: this test's process with its parent, and a child
+// whose short name holds the blanks and parentheses that end a name in
+// /proc's stat line.
+TEST(SystemProcessTableTest, ListsThisProcessAndAChildWithAnOddName) {
+  int ready[2];
+  ASSERT_EQ(pipe(ready), 0);
+  pid_t child = fork();
+  ASSERT_GE(child, 0);
+  if (child == 0) {
+#if defined(__linux__)
+    prctl(PR_SET_NAME, "a) (b c");
+#endif
+    char byte = 1;
+    (void)!write(ready[1], &byte, 1);
+    pause();
+    _exit(0);
+  }
+  char byte = 0;
+  ASSERT_EQ(read(ready[0], &byte, 1), 1);
+  std::vector<ProcessEntry> entries;
+  bool read_ok = makeSystemProcessTable()->read(&entries);
+  kill(child, SIGKILL);
+  waitpid(child, nullptr, 0);
+  close(ready[0]);
+  close(ready[1]);
+  ASSERT_TRUE(read_ok);
+  auto find = [&entries](int64_t pid) {
+    return std::find_if(entries.begin(), entries.end(),
+                        [pid](const ProcessEntry& e) { return e.pid == pid; });
+  };
+  auto self = find(getpid());
+  ASSERT_NE(self, entries.end());
+  EXPECT_EQ(self->ppid, getppid());
+  auto forked = find(child);
+  ASSERT_NE(forked, entries.end());
+  EXPECT_EQ(forked->ppid, getpid());
+#if defined(__linux__)
+  EXPECT_EQ(forked->short_name, "a) (b c");
+#endif
 }
 
 }  // namespace

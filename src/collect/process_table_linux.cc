@@ -44,6 +44,12 @@ bool readStat(int proc, const char* pid_text, int64_t pid, ProcessEntry* entry) 
       continue;
     }
     if (got <= 0) break;
+    // The kernel hands the whole line in one read; asking again only to be
+    // told it ended is one system call per process on a busy machine.
+    if (buffer[size + static_cast<size_t>(got) - 1] == '\n') {
+      size += static_cast<size_t>(got);
+      break;
+    }
   }
   ::close(fd);
   std::string_view stat(buffer, size);
