@@ -91,12 +91,12 @@ void BM_ScanAgainstFloor(benchmark::State& state) {
 
     // The same stages one by one, for the table.
     double t = cpuSeconds();
-    PlistValue plist;
+    Plist plist;
     parsePlist(document, &plist);
     double parsed = cpuSeconds();
     auto raw = std::make_unique<TagTree>(true, "Macintosh");
     PlistConverter(*raw).convertPlist(plist);
-    plist = PlistValue();
+    plist = Plist();
     double converted = cpuSeconds();
     TagTree snapshot(true, "Snapshot");
     postProcess(snapshot, *raw, false, fakes.runner, fakes.files, nullptr);

@@ -14,28 +14,29 @@ std::string plistText(const PlistValue& v) {
   using Kind = PlistValue::Kind;
   std::string out;
   char buf[16];
-  for (unsigned char c : v.text) {
+  for (unsigned char c : v.text()) {
     std::snprintf(buf, sizeof buf, c >= 0x20 && c < 0x7F ? "%c" : "\\x%02X", c);
     out += buf;
   }
-  for (const PlistValue& e : v.array) out += "," + plistText(e);
-  for (const PlistEntry& e : v.dictionary) out += "," + e.key + ":" + plistText(e.value);
+  for (const PlistValue& e : v.items()) out += "," + plistText(e);
+  for (const PlistEntry& e : v.entries())
+    out += "," + std::string(e.key) + ":" + plistText(e.value);
   std::string items = out.substr(out.empty() ? 0 : 1);
-  std::snprintf(buf, sizeof buf, "%.2f", v.real);
-  if (v.kind == Kind::kString || v.kind == Kind::kData)
-    return (v.kind == Kind::kString ? "s\"" : "x\"") + out + "\"";
+  std::snprintf(buf, sizeof buf, "%.2f", v.real());
+  if (v.kind() == Kind::kString || v.kind() == Kind::kData)
+    return (v.kind() == Kind::kString ? "s\"" : "x\"") + out + "\"";
   if (v.isArray()) return "[" + items + "]";
   if (v.isDictionary()) return "{" + items + "}";
-  if (v.kind == Kind::kReal) return std::string("r") + buf;
-  return (v.kind == Kind::kInteger ? "i"
-          : v.kind == Kind::kDate  ? "d"
-                                   : "b") +
-         std::to_string(v.integer);
+  if (v.kind() == Kind::kReal) return std::string("r") + buf;
+  return (v.kind() == Kind::kInteger ? "i"
+          : v.kind() == Kind::kDate  ? "d"
+                                     : "b") +
+         std::to_string(v.integer());
 }
 
 // The rendering of `document`, or "false" when the reader gives up.
 std::string parsed(const std::string& document) {
-  PlistValue value;
+  Plist value;
   return parsePlist(document, &value) ? plistText(value) : "false";
 }
 
