@@ -63,8 +63,10 @@ ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part
   Plist plist;
   parseCollectedDocument(document, part_ends, &plist, &result.parse_warning);
   addExtraTypes(extra_documents, &plist);
-  document = std::string();
-  extra_documents.clear();
+  // Swapped out rather than assigned: assigning an empty string keeps the
+  // document's whole buffer allocated.
+  std::string().swap(document);
+  std::vector<std::string>().swap(extra_documents);
 
   QuickFacts facts = readQuickFacts(plist, sources.runner);
   NetworkIdentity identity;
