@@ -125,6 +125,26 @@ TEST(PlistTest, OddDocuments) {
   for (const auto& c : cases) EXPECT_EQ(parsed(c.document), c.expected) << c.document.substr(0, 99);
 }
 
+TEST(PlistTest, BytesToCarryAreFoundAnywhereInALongDocument) {
+  // A document with nothing to carry through expat is parsed as it is, so
+  // every kind of byte that must be carried has to be noticed wherever it
+  // stands in a long run of plain text.
+  struct {
+    const char* bytes;
+    const char* shown;  // as plistText renders it; null: the value is refused
+  } cases[] = {
+      {"\x01", "\\x01"}, {"\r", "\\x0D"}, {"\xFF", "\\xFF"},  {"\xEF\x9C\x80", "\\xEF\\x9C\\x80"},
+      {"&#1;", "\\x01"}, {"]]>", "]]>"},  {"&nbsp;", nullptr}};
+  for (const auto& c : cases) {
+    for (size_t before = 0; before <= 130; ++before) {
+      const std::string head(before, 'a'), tail(130 - before, 'b');
+      const std::string expected = c.shown ? "s\"" + head + c.shown + tail + "\"" : "false";
+      ASSERT_EQ(parsed("<plist><string>" + head + c.bytes + tail + "</string></plist>"), expected)
+          << c.bytes << " after " << before;
+    }
+  }
+}
+
 TEST(PlistTest, EveryAccessorAnswersForEveryKind) {
   // Readers ask without checking the kind first: a value of another kind
   // must read as empty, never as another member's bytes.
