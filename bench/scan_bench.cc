@@ -49,19 +49,19 @@ void setCounters(benchmark::State& state, size_t bytes) {
 void BM_Parse(benchmark::State& state) {
   std::string doc = makeDocument(static_cast<int>(state.range(0)));
   for (auto _ : state) {
-    PlistValue plist;
+    Plist plist;
     parsePlist(doc, &plist);
     benchmark::DoNotOptimize(plist);
   }
   setCounters(state, doc.size());
-  PlistValue kept;
+  Plist kept;
   parsePlist(doc, &kept);
   state.counters["heap_MB"] = heapMegabytes();
 }
 
 void BM_Convert(benchmark::State& state) {
   std::string doc = makeDocument(static_cast<int>(state.range(0)));
-  PlistValue plist;
+  Plist plist;
   parsePlist(doc, &plist);
   for (auto _ : state) {
     TagTree raw(true, "Macintosh");
@@ -82,7 +82,7 @@ struct ConvertedDocument {
     PlistConverter(raw).convertPlist(plist);
   }
   std::string doc;
-  PlistValue plist;
+  Plist plist;
   TagTree raw{true, "Macintosh"};
   // The builders that gather for themselves get a quiet machine.
   FakeScanSources fakes = quietMachine();

@@ -15,7 +15,7 @@
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   std::string_view input(reinterpret_cast<const char*>(data), size);
-  cvn::PlistValue root;
+  cvn::Plist root;
   std::string warning;
   if (!cvn::parsePlist(input, &root, &warning)) return 0;
 

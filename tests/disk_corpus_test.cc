@@ -18,7 +18,7 @@ namespace {
 
 // One line per disk: its name, size and byte count.
 std::string diskSizes(const std::string& file) {
-  PlistValue root;  // An unreadable recording shows as "no disks".
+  Plist root;  // An unreadable recording shows as "no disks".
   parsePlist(readWholeFile(findCorpus() / "glpi-agent/resources/macos/system_profiler" / file),
              &root);
   TagTree raw(true, "Macintosh");
@@ -53,7 +53,7 @@ TEST(DiskCorpusTest, DiskSizes) {
 
 // The whole Storage section of a recording, as text.
 std::string storageText(const std::filesystem::path& file) {
-  PlistValue root;
+  Plist root;
   parsePlist(readWholeFile(findCorpus() / file), &root);
   TagTree raw(true, "Macintosh");
   PlistConverter(raw).convertPlist(root);

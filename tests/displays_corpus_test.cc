@@ -20,7 +20,7 @@ TEST(DisplaysCorpusTest, RecordedDisplayDataBuildsTheVideoSection) {
   std::error_code error;
   for (const auto& entry : std::filesystem::recursive_directory_iterator(root, error)) {
     std::string text = entry.is_regular_file() ? readWholeFile(entry.path()) : "";
-    PlistValue value;
+    Plist value;
     if (!isPlistText(text) || text.find("SPDisplaysDataType") == std::string::npos ||
         !parsePlist(text, &value))
       continue;

@@ -29,7 +29,7 @@ TEST(HardwareSectionsCorpusTest, ModelSerialAndMemoryOfThreeMacs) {
        "model=\"MacBookPro11,1\"", "serial=\"ABCDEFG12345\"", "physical-memory=16384\n"},
   };
   for (const auto& machine : machines) {
-    PlistValue value;
+    Plist value;
     ASSERT_TRUE(parsePlist(readWholeFile(corpus / machine[0]), &value)) << machine[0];
     TagTree raw(true, "Macintosh"), snapshot(true, "Snapshot");
     PlistConverter(raw).convertPlist(value);

@@ -24,11 +24,11 @@ std::string readExample() {
 
 std::string stringAt(const PlistValue& dict, const char* key) {
   const PlistValue* value = dict.find(key);
-  return value && value->isString() ? value->text : "(missing)";
+  return value && value->isString() ? std::string(value->text()) : "(missing)";
 }
 
 TEST(LaunchdExampleTest, StartsASilentScanInItsFolderOnASchedule) {
-  PlistValue job;
+  Plist job;
   std::string warning;
   ASSERT_TRUE(parsePlist(readExample(), &job, &warning));
   EXPECT_EQ(warning, "");
@@ -39,7 +39,7 @@ TEST(LaunchdExampleTest, StartsASilentScanInItsFolderOnASchedule) {
   const PlistValue* arguments = job.find("ProgramArguments");
   ASSERT_TRUE(arguments && arguments->isArray());
   std::vector<std::string> words;
-  for (const PlistValue& word : arguments->array) words.push_back(word.text);
+  for (const PlistValue& word : arguments->items()) words.emplace_back(word.text());
   ASSERT_FALSE(words.empty());
   EXPECT_EQ(words[0], "/usr/local/sbin/cvnmacagent");
 
@@ -66,21 +66,21 @@ TEST(LaunchdExampleTest, StartsASilentScanInItsFolderOnASchedule) {
 
   // launchd ignores a calendar field that is not an integer in its range.
   const PlistValue* when = job.find("StartCalendarInterval");
-  ASSERT_TRUE(when && when->isDictionary() && !when->dictionary.empty());
+  ASSERT_TRUE(when && when->isDictionary() && !when->entries().empty());
   const std::vector<std::pair<std::string, std::pair<int, int>>> ranges = {{"Minute", {0, 59}},
                                                                            {"Hour", {0, 23}},
                                                                            {"Day", {1, 31}},
                                                                            {"Weekday", {0, 7}},
                                                                            {"Month", {1, 12}}};
-  for (const PlistEntry& field : when->dictionary) {
+  for (const PlistEntry& field : when->entries()) {
     SCOPED_TRACE(field.key);
-    ASSERT_EQ(field.value.kind, PlistValue::Kind::kInteger);
+    ASSERT_EQ(field.value.kind(), PlistValue::Kind::kInteger);
     bool known = false;
     for (const auto& range : ranges) {
       if (range.first != field.key) continue;
       known = true;
-      EXPECT_GE(field.value.integer, range.second.first);
-      EXPECT_LE(field.value.integer, range.second.second);
+      EXPECT_GE(field.value.integer(), range.second.first);
+      EXPECT_LE(field.value.integer(), range.second.second);
     }
     EXPECT_TRUE(known);
   }

@@ -82,7 +82,7 @@ TEST(NetworkIdentityTest, EdgeCases) {
        "", "1.2.3.4||0|kept||auto"},
   };
   for (const auto& c : cases) {
-    PlistValue root;
+    Plist root;
     ASSERT_TRUE(parsePlist(c.xml, &root));
     NetworkIdentity out{"", 0, "kept", "", true};
     std::string ip = c.ip;

@@ -26,7 +26,7 @@ std::string convertedAndChecked(const PlistValue& root) {
 // inside, sanitised keys, item numbers kept across dropped values, and a data
 // type that comes twice landing in one tag.
 TEST(PlistConverterTest, ConvertsTheDataTypes) {
-  PlistValue root;
+  Plist root;
   ASSERT_TRUE(parsePlist(R"(<array>
     <dict><key>_dataType</key><string>SPLogsDataType</string><key>k</key><string>v</string></dict>
     <dict><key>_dataType</key><string>SPFontsDataType</string><key>k</key><string>v</string></dict>

@@ -2,8 +2,13 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdint>
 #include <cstdio>
+#include <optional>
 #include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
 
 namespace cvn {
 namespace {
@@ -14,28 +19,29 @@ std::string plistText(const PlistValue& v) {
   using Kind = PlistValue::Kind;
   std::string out;
   char buf[16];
-  for (unsigned char c : v.text) {
+  for (unsigned char c : v.text()) {
     std::snprintf(buf, sizeof buf, c >= 0x20 && c < 0x7F ? "%c" : "\\x%02X", c);
     out += buf;
   }
-  for (const PlistValue& e : v.array) out += "," + plistText(e);
-  for (const PlistEntry& e : v.dictionary) out += "," + e.key + ":" + plistText(e.value);
+  for (const PlistValue& e : v.items()) out += "," + plistText(e);
+  for (const PlistEntry& e : v.entries())
+    out += "," + std::string(e.key) + ":" + plistText(e.value);
   std::string items = out.substr(out.empty() ? 0 : 1);
-  std::snprintf(buf, sizeof buf, "%.2f", v.real);
-  if (v.kind == Kind::kString || v.kind == Kind::kData)
-    return (v.kind == Kind::kString ? "s\"" : "x\"") + out + "\"";
+  std::snprintf(buf, sizeof buf, "%.2f", v.real());
+  if (v.kind() == Kind::kString || v.kind() == Kind::kData)
+    return (v.kind() == Kind::kString ? "s\"" : "x\"") + out + "\"";
   if (v.isArray()) return "[" + items + "]";
   if (v.isDictionary()) return "{" + items + "}";
-  if (v.kind == Kind::kReal) return std::string("r") + buf;
-  return (v.kind == Kind::kInteger ? "i"
-          : v.kind == Kind::kDate  ? "d"
-                                   : "b") +
-         std::to_string(v.integer);
+  if (v.kind() == Kind::kReal) return std::string("r") + buf;
+  return (v.kind() == Kind::kInteger ? "i"
+          : v.kind() == Kind::kDate  ? "d"
+                                     : "b") +
+         std::to_string(v.integer());
 }
 
 // The rendering of `document`, or "false" when the reader gives up.
 std::string parsed(const std::string& document) {
-  PlistValue value;
+  Plist value;
   return parsePlist(document, &value) ? plistText(value) : "false";
 }
 
@@ -117,6 +123,113 @@ TEST(PlistTest, OddDocuments) {
        "{k\x01\r:b1}"},
   };
   for (const auto& c : cases) EXPECT_EQ(parsed(c.document), c.expected) << c.document.substr(0, 99);
+}
+
+TEST(PlistTest, BytesToCarryAreFoundAnywhereInALongDocument) {
+  // A document with nothing to carry through expat is parsed as it is, so
+  // every kind of byte that must be carried has to be noticed wherever it
+  // stands in a long run of plain text.
+  struct {
+    const char* bytes;
+    const char* shown;  // as plistText renders it; null: the value is refused
+  } cases[] = {
+      {"\x01", "\\x01"}, {"\r", "\\x0D"}, {"\xFF", "\\xFF"},  {"\xEF\x9C\x80", "\\xEF\\x9C\\x80"},
+      {"&#1;", "\\x01"}, {"]]>", "]]>"},  {"&nbsp;", nullptr}};
+  for (const auto& c : cases) {
+    for (size_t before = 0; before <= 130; ++before) {
+      const std::string head(before, 'a'), tail(130 - before, 'b');
+      const std::string expected = c.shown ? "s\"" + head + c.shown + tail + "\"" : "false";
+      ASSERT_EQ(parsed("<plist><string>" + head + c.bytes + tail + "</string></plist>"), expected)
+          << c.bytes << " after " << before;
+    }
+  }
+}
+
+TEST(PlistTest, EveryAccessorAnswersForEveryKind) {
+  // Readers ask without checking the kind first: a value of another kind
+  // must read as empty, never as another member's bytes.
+  struct {
+    const char* element;
+    const char* text;
+    int64_t integer;
+    double real;
+    size_t items;
+    size_t entries;
+  } cases[] = {
+      {"<string>s</string>", "s", 0, 0, 0, 0},
+      {"<data>aGk=</data>", "hi", 0, 0, 0, 0},
+      {"<integer>7</integer>", "", 7, 0, 0, 0},
+      {"<date>1970-01-01T00:01:00Z</date>", "", 60, 0, 0, 0},
+      {"<true/>", "", 1, 0, 0, 0},
+      {"<real>2.5</real>", "", 0, 2.5, 0, 0},
+      {"<array><string>a</string><string>b</string></array>", "", 0, 0, 2, 0},
+      {"<dict><key>a</key><string>x</string></dict>", "", 0, 0, 0, 1},
+  };
+  for (const auto& c : cases) {
+    Plist value;
+    ASSERT_TRUE(parsePlist(c.element, &value)) << c.element;
+    EXPECT_EQ(value.text(), c.text) << c.element;
+    EXPECT_EQ(value.integer(), c.integer) << c.element;
+    EXPECT_EQ(value.real(), c.real) << c.element;
+    EXPECT_EQ(value.items().size(), c.items) << c.element;
+    EXPECT_EQ(value.entries().size(), c.entries) << c.element;
+    EXPECT_EQ(value.findText("a"), c.entries ? std::optional<std::string_view>("x") : std::nullopt)
+        << c.element;
+    EXPECT_EQ(value.textAt("a"), c.entries ? "x" : "") << c.element;
+  }
+  const PlistValue empty;
+  EXPECT_TRUE(empty.isString() && empty.text().empty() && empty.entries().empty());
+}
+
+TEST(PlistTest, ValuesOutliveMovesAndMerges) {
+  // Under the address sanitizer, a value left pointing into freed storage
+  // fails here.
+  Plist list;
+  ASSERT_TRUE(
+      parsePlist("<array><string>first</string><dict><key>k</key><integer>1</integer>"
+                 "</dict></array>",
+                 &list));
+  const PlistValue* first = &list.items()[0];
+  Plist moved = std::move(list);
+  EXPECT_TRUE(list.isString() && list.items().empty());  // moved from: left empty
+  EXPECT_EQ(first->text(), "first");
+
+  for (const char* document : {"<array><string>second</string><string>skipped</string></array>",
+                               "<array><string>third</string></array>"}) {
+    Plist other;
+    ASSERT_TRUE(parsePlist(document, &other));
+    moved.appendItems({&other.items()[0]}, std::move(other));
+    EXPECT_TRUE(other.items().empty());  // moved from: left empty
+  }
+  Plist target;
+  target = std::move(moved);
+  EXPECT_EQ(plistText(target), "[s\"first\",{k:i1},s\"second\",s\"third\"]");
+}
+
+TEST(PlistTest, RepeatedKeysAreStoredOnce) {
+  Plist list;
+  ASSERT_TRUE(
+      parsePlist("<array><dict><key>_name</key><string>a</string></dict>"
+                 "<dict><key>_name</key><string>b</string></dict></array>",
+                 &list));
+  EXPECT_EQ(list.items()[0].entries()[0].key.data(), list.items()[1].entries()[0].key.data());
+
+  // More distinct keys than are shared, and a repeat of an early one after
+  // them: every key still reads back, and the repeat keeps its position.
+  std::string many = "<dict>";
+  for (int i = 0; i < 5000; ++i)
+    many += "<key>k" + std::to_string(i) + "</key><integer>" + std::to_string(i) + "</integer>";
+  many += "<key>k3</key><string>again</string></dict>";
+  ASSERT_TRUE(parsePlist(many, &list));
+  ASSERT_EQ(list.entries().size(), 5000u);
+  for (int i = 0; i < 5000; ++i) {
+    const PlistEntry& entry = list.entries()[i];
+    ASSERT_EQ(entry.key, "k" + std::to_string(i));
+    if (i != 3) {
+      ASSERT_EQ(entry.value.integer(), i);
+    }
+  }
+  EXPECT_EQ(list.textAt("k3"), "again");
 }
 
 }  // namespace

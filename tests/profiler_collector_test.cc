@@ -106,9 +106,9 @@ std::string typeDict(const std::string& type) {
 
 std::vector<std::string> dataTypes(const PlistValue& root) {
   std::vector<std::string> types;
-  for (const PlistValue& d : root.array) {
+  for (const PlistValue& d : root.items()) {
     const PlistValue* type = d.find("_dataType");
-    types.push_back(type ? type->text : "(none)");
+    types.push_back(type ? std::string(type->text()) : "(none)");
   }
   return types;
 }
@@ -127,7 +127,7 @@ TEST(CollectedDocumentTest, AMalformedPieceCostsOnlyItself) {
   ASSERT_EQ(part_ends.size(), 21u);
   EXPECT_EQ(part_ends.back(), document.size());
 
-  PlistValue root;
+  Plist root;
   ASSERT_TRUE(parseCollectedDocument(document, part_ends, &root));
   std::vector<std::string> types = dataTypes(root);
   ASSERT_EQ(types.size(), 21u);
@@ -141,7 +141,7 @@ TEST(CollectedDocumentTest, AMalformedPieceCostsOnlyItself) {
 TEST(CollectedDocumentTest, AWellFormedDocumentIsReadWhole) {
   std::string document =
       std::string(kProfilerHeader) + typeDict("A") + typeDict("B") + std::string(kProfilerFooter);
-  PlistValue root;
+  Plist root;
   ASSERT_TRUE(parseCollectedDocument(document, {10, document.size()}, &root));
   EXPECT_EQ(dataTypes(root), (std::vector<std::string>{"A", "B"}));
   EXPECT_FALSE(parseCollectedDocument("no xml here", {5, 11}, &root));
@@ -193,7 +193,7 @@ TEST(ExtraTypesTest, OnlyTheAskedTypesJoinTheListAndEachOnce) {
        {"SPNVMeDataType"}},
   };
   for (const auto& c : cases) {
-    PlistValue root;
+    Plist root;
     if (!c.root_types.empty()) {
       std::string main;
       for (const std::string& type : c.root_types) main += typeDict(type);

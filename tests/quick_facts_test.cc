@@ -26,7 +26,7 @@ std::string profilerList(const std::vector<std::pair<std::string, std::string>>&
 
 // Every field that comes from the profiler list, one per line, empty ones too.
 std::string factsText(const std::string& list) {
-  PlistValue root;
+  Plist root;
   EXPECT_TRUE(parsePlist(list, &root));
   FakeCommandRunner runner;  // ioreg prints nothing
   QuickFacts f = readQuickFacts(root, runner);

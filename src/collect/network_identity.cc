@@ -1,5 +1,6 @@
 #include "collect/network_identity.h"
 
+#include <optional>
 #include <string_view>
 
 namespace cvn {
@@ -7,19 +8,20 @@ namespace cvn {
 namespace {
 
 std::string firstAddress(const PlistValue& addresses) {
-  if (addresses.array.empty() || !addresses.array.front().isString()) return std::string();
-  return addresses.array.front().text;
+  if (addresses.items().empty() || !addresses.items().front().isString()) return std::string();
+  return std::string(addresses.items().front().text());
 }
 
 // Manual flag and hardware address of the chosen interface.
 void readInterface(const PlistValue& item, bool* manual, std::string* hardware_address) {
   if (const PlistValue* ipv4 = item.findDictionary("IPv4")) {
-    const std::string* method = ipv4->findText("ConfigMethod");
+    std::optional<std::string_view> method = ipv4->findText("ConfigMethod");
     *manual = method && *method == "Manual";
   }
   hardware_address->clear();
   if (const PlistValue* ethernet = item.findDictionary("Ethernet")) {
-    if (const std::string* mac = ethernet->findText("MAC Address")) *hardware_address = *mac;
+    if (std::optional<std::string_view> mac = ethernet->findText("MAC Address"))
+      *hardware_address = *mac;
   }
 }
 
@@ -45,11 +47,11 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
   std::string hardware_address;
   const PlistValue* interfaces = findProfilerItems(root, "SPNetworkDataType");
   if (interfaces) {
-    for (const PlistValue& item : interfaces->array) {
+    for (const PlistValue& item : interfaces->items()) {
       if (!item.isDictionary()) continue;
       const PlistValue* addresses = item.findArray("ip_address");
       if (ip.empty()) {
-        const std::string* name = item.findText("interface");
+        std::optional<std::string_view> name = item.findText("interface");
         if (!name || name->compare(0, 2, "en") != 0 || !addresses) continue;
         ip = firstAddress(*addresses);
       } else {
@@ -66,9 +68,9 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
   const PlistValue* locations = findProfilerItems(root, "SPNetworkLocationDataType");
   const PlistValue* services = nullptr;
   if (locations) {
-    for (const PlistValue& location : locations->array) {
+    for (const PlistValue& location : locations->items()) {
       if (!location.isDictionary()) continue;
-      const std::string* active = location.findText("spnetworklocation_isActive");
+      std::optional<std::string_view> active = location.findText("spnetworklocation_isActive");
       if (!active || *active != "yes") continue;
       services = location.findArray("spnetworklocation_services");
       break;
@@ -77,18 +79,18 @@ std::string readNetworkIdentity(const PlistValue& root, std::string& ip, Network
   // An interface without a hardware address matches no service.
   if (!services || hardware_address.empty()) return out->workgroup;
 
-  for (const PlistValue& service : services->array) {
+  for (const PlistValue& service : services->items()) {
     if (!service.isDictionary()) continue;
-    const std::string* address = service.findText("hardware_address");
+    std::optional<std::string_view> address = service.findText("hardware_address");
     if (!address || *address != hardware_address) continue;
     out->mac_address.clear();
     for (char c : hardware_address) out->mac_address += c == ':' ? '-' : upperAscii(c);
     const PlistValue* smb = service.findDictionary("SMB");
-    const std::string* workgroup = smb ? smb->findText("Workgroup") : nullptr;
+    std::optional<std::string_view> workgroup = smb ? smb->findText("Workgroup") : std::nullopt;
     if (!workgroup) continue;
     for (char c : *workgroup) out->workgroup += upperAscii(c);
     out->workgroup_length = utf16Length(out->workgroup);
-    const std::string* netbios = smb->findText("NetBIOSName");
+    std::optional<std::string_view> netbios = smb->findText("NetBIOSName");
     if (netbios) out->netbios_name = *netbios;
     break;
   }

@@ -3,16 +3,62 @@
 #include <expat.h>
 
 #include <algorithm>
-#include <cstring>
-#include <iterator>
+#include <functional>
 #include <memory>
 #include <unordered_map>
 #include <utility>
+#include <vector>
 
 #include "collect/plist_bytes.h"
 #include "collect/plist_leaves.h"
 
 namespace cvn {
+
+// The reader's access to the handles' insides; texts and lists given to it
+// already live in the arena that ends up in the Plist.
+class PlistBuilder {
+ public:
+  using Kind = PlistValue::Kind;
+
+  static PlistValue text(Kind kind, std::string_view text) {
+    PlistValue value;
+    value.kind_ = kind;
+    value.text_ = text.data();
+    value.size_ = text.size();
+    return value;
+  }
+  static PlistValue number(Kind kind, int64_t number) {
+    PlistValue value;
+    value.kind_ = kind;
+    value.integer_ = number;
+    return value;
+  }
+  static PlistValue real(double real) {
+    PlistValue value;
+    value.kind_ = Kind::kReal;
+    value.real_ = real;
+    return value;
+  }
+  static PlistValue array(const PlistValue* items, size_t size) {
+    PlistValue value;
+    value.kind_ = Kind::kArray;
+    value.items_ = items;
+    value.size_ = size;
+    return value;
+  }
+  static PlistValue dictionary(const PlistEntry* entries, size_t size) {
+    PlistValue value;
+    value.kind_ = Kind::kDictionary;
+    value.entries_ = entries;
+    value.size_ = size;
+    return value;
+  }
+  static void take(const PlistValue& root, Arena&& arena, Plist* out) {
+    static_cast<PlistValue&>(*out) = root;
+    out->arena_ = std::move(arena);
+  }
+};
+
 namespace {
 
 constexpr size_t kMaxDepth = 256;
@@ -49,59 +95,100 @@ Element elementOf(const char* name) {
 }
 
 struct Frame {
-  PlistValue value;  // kArray or kDictionary
-  std::string key;
+  bool is_array = false;
+  std::vector<PlistValue> items;
+  std::vector<PlistEntry> entries;
+  std::string_view key;  // in the arena
   bool has_key = false;
   bool key_refused = false;
-  std::unique_ptr<std::unordered_map<std::string, size_t>> index;
+  // Key positions, kept once a dictionary outgrows a linear search.
+  bool indexed = false;
+  std::unordered_map<std::string_view, size_t> index;
 };
 
 // The open containers. A frame's lists are filled in place and keep their
 // room when the container closes: the next container at that depth grows
-// into it, and each closed container gets one list of its exact size. A
-// list growing one entry at a time instead allocated and moved its entries
-// several times for every dictionary of the document.
+// into it, and each closed container gets one list of its exact size in the
+// arena. A list growing one entry at a time instead allocated and moved its
+// entries several times for every dictionary of the document.
 class FrameStack {
  public:
   bool empty() const { return depth_ == 0; }
   size_t size() const { return depth_; }
   Frame& back() { return frames_[depth_ - 1]; }
 
-  void push(PlistValue::Kind kind) {
+  void push(bool is_array) {
     if (depth_ == frames_.size()) frames_.emplace_back();
     Frame& frame = frames_[depth_++];
-    frame.value.kind = kind;
-    frame.value.array.clear();
-    frame.value.dictionary.clear();
-    frame.key.clear();
+    frame.is_array = is_array;
+    frame.items.clear();
+    frame.entries.clear();
+    frame.key = std::string_view();
     frame.has_key = false;
     frame.key_refused = false;
-    frame.index.reset();
+    if (frame.indexed) frame.index.clear();
+    frame.indexed = false;
   }
 
-  PlistValue pop() {
+  PlistValue pop(Arena& arena) {
     Frame& frame = frames_[--depth_];
-    PlistValue value;
-    value.kind = frame.value.kind;
-    value.array.reserve(frame.value.array.size());
-    std::move(frame.value.array.begin(), frame.value.array.end(), std::back_inserter(value.array));
-    value.dictionary.reserve(frame.value.dictionary.size());
-    std::move(frame.value.dictionary.begin(), frame.value.dictionary.end(),
-              std::back_inserter(value.dictionary));
-    frame.value.array.clear();
-    frame.value.dictionary.clear();
-    frame.index.reset();
+    if (frame.is_array) {
+      PlistValue value = PlistBuilder::array(copyList(frame.items, arena), frame.items.size());
+      frame.items.clear();
+      return value;
+    }
+    PlistValue value =
+        PlistBuilder::dictionary(copyList(frame.entries, arena), frame.entries.size());
+    frame.entries.clear();
     return value;
   }
 
  private:
+  template <typename T>
+  static const T* copyList(const std::vector<T>& list, Arena& arena) {
+    if (list.empty()) return nullptr;
+    T* copy = static_cast<T*>(arena.allocate(sizeof(T) * list.size(), alignof(T)));
+    std::uninitialized_copy(list.begin(), list.end(), copy);
+    return copy;
+  }
+
   std::vector<Frame> frames_;
   size_t depth_ = 0;
 };
 
+// Profiler dictionaries repeat a few dozen keys once per item ("_name",
+// "version", ...): each is stored once. The table stops taking keys at a
+// fixed size, so a document of distinct keys costs one copy of each, as
+// without the table, and no more.
+class KeyTable {
+ public:
+  std::string_view intern(std::string_view key, Arena& arena) {
+    if (slots_.empty()) slots_.resize(kSlots);
+    for (size_t i = std::hash<std::string_view>()(key) & (kSlots - 1);;
+         i = (i + 1) & (kSlots - 1)) {
+      std::string_view& slot = slots_[i];
+      if (!slot.data()) {
+        std::string_view copy = arena.copyText(key);
+        if (used_ < kSlots / 2) {
+          slot = copy;
+          ++used_;
+        }
+        return copy;
+      }
+      if (slot == key) return slot;
+    }
+  }
+
+ private:
+  static constexpr size_t kSlots = 4096;
+  // Empty slots have no data (a stored key always has, even when empty).
+  std::vector<std::string_view> slots_;
+  size_t used_ = 0;
+};
+
 class Reader {
  public:
-  bool read(std::string_view document, PlistValue* out, std::string* warning);
+  bool read(std::string_view document, Plist* out, std::string* warning);
 
  private:
   static void XMLCALL onStart(void* self, const XML_Char* name, const XML_Char** attributes);
@@ -116,18 +203,21 @@ class Reader {
   void finishLeaf();
   /// The leaf just closed as a value; false when CoreFoundation would refuse it.
   bool readLeaf(PlistValue* value);
-  void attach(PlistValue&& value);
+  void attach(const PlistValue& value);
   void drop(const char* why);
-  void insert(Frame& frame, std::string&& key, PlistValue&& value);
+  void insert(Frame& frame, std::string_view key, const PlistValue& value);
   void note(const std::string& problem);
 
   XML_Parser parser_ = nullptr;
+  Arena arena_;
   FrameStack stack_;
+  KeyTable keys_;
   // The leaf element being read, if any; leaves never nest.
   bool in_leaf_ = false;
   Element leaf_ = Element::kUnknown;
   bool leaf_refused_ = false;
   std::string text_;
+  std::string decoded_;
   // Depth inside an element whose value is dropped as a whole.
   size_t ignored_ = 0;
   bool in_plist_ = false;
@@ -144,34 +234,33 @@ void Reader::note(const std::string& problem) {
   }
 }
 
-void Reader::insert(Frame& frame, std::string&& key, PlistValue&& value) {
-  std::vector<PlistEntry>& entries = frame.value.dictionary;
-  if (frame.index) {
-    auto found = frame.index->find(key);
-    if (found != frame.index->end()) {
-      entries[found->second].value = std::move(value);
+void Reader::insert(Frame& frame, std::string_view key, const PlistValue& value) {
+  std::vector<PlistEntry>& entries = frame.entries;
+  if (frame.indexed) {
+    auto [found, added] = frame.index.try_emplace(key, entries.size());
+    if (!added) {
+      entries[found->second].value = value;
       return;
     }
-    frame.index->emplace(key, entries.size());
   } else {
     for (PlistEntry& entry : entries) {
       if (entry.key == key) {
-        entry.value = std::move(value);
+        entry.value = value;
         return;
       }
     }
   }
-  entries.push_back(PlistEntry{std::move(key), std::move(value)});
-  if (!frame.index && entries.size() > kIndexThreshold) {
-    frame.index = std::make_unique<std::unordered_map<std::string, size_t>>();
-    for (size_t i = 0; i < entries.size(); ++i) frame.index->emplace(entries[i].key, i);
+  entries.push_back(PlistEntry{key, value});
+  if (!frame.indexed && entries.size() > kIndexThreshold) {
+    frame.indexed = true;
+    for (size_t i = 0; i < entries.size(); ++i) frame.index.emplace(entries[i].key, i);
   }
 }
 
-void Reader::attach(PlistValue&& value) {
+void Reader::attach(const PlistValue& value) {
   if (stack_.empty()) {
     if (!root_done_) {
-      root_ = std::move(value);
+      root_ = value;
       root_done_ = true;
       // Whatever follows the first value is ignored, as CoreFoundation does.
       XML_StopParser(parser_, XML_FALSE);
@@ -179,8 +268,8 @@ void Reader::attach(PlistValue&& value) {
     return;
   }
   Frame& frame = stack_.back();
-  if (frame.value.kind == PlistValue::Kind::kArray) {
-    frame.value.array.push_back(std::move(value));
+  if (frame.is_array) {
+    frame.items.push_back(value);
     return;
   }
   if (!frame.has_key) {
@@ -189,14 +278,12 @@ void Reader::attach(PlistValue&& value) {
   }
   frame.has_key = false;
   if (frame.key_refused) return;
-  insert(frame, std::move(frame.key), std::move(value));
-  frame.key.clear();
+  insert(frame, frame.key, value);
 }
 
 void Reader::drop(const char* why) {
   note(why);
-  if (!stack_.empty() && stack_.back().value.kind == PlistValue::Kind::kDictionary)
-    stack_.back().has_key = false;
+  if (!stack_.empty() && !stack_.back().is_array) stack_.back().has_key = false;
 }
 
 void Reader::start(const char* name) {
@@ -223,8 +310,7 @@ void Reader::start(const char* name) {
         ignored_ = 1;
         return;
       }
-      stack_.push(element == Element::kArray ? PlistValue::Kind::kArray
-                                             : PlistValue::Kind::kDictionary);
+      stack_.push(element == Element::kArray);
       return;
     case Element::kPlist:
     case Element::kUnknown:
@@ -244,7 +330,7 @@ void Reader::finishLeaf() {
   in_leaf_ = false;
   bool readable = restoreEscapedBytes(text_) && !leaf_refused_;
   if (leaf_ == Element::kKey) {
-    if (stack_.empty() || stack_.back().value.kind != PlistValue::Kind::kDictionary) {
+    if (stack_.empty() || stack_.back().is_array) {
       note("key outside a dictionary");
       return;
     }
@@ -252,9 +338,11 @@ void Reader::finishLeaf() {
     if (frame.has_key) note("key without a value");
     frame.has_key = true;
     frame.key_refused = !readable;
-    if (!readable) note("unreadable key");
-    frame.key = std::move(text_);
-    text_.clear();
+    if (!readable) {
+      note("unreadable key");
+      return;
+    }
+    frame.key = keys_.intern(text_, arena_);
     return;
   }
   PlistValue value;
@@ -263,36 +351,41 @@ void Reader::finishLeaf() {
     drop("unreadable value");
     return;
   }
-  attach(std::move(value));
+  attach(value);
 }
 
 bool Reader::readLeaf(PlistValue* value) {
   using Kind = PlistValue::Kind;
+  int64_t number = 0;
+  double real = 0.0;
   switch (leaf_) {
     case Element::kString:
-      value->kind = Kind::kString;
-      value->text = std::move(text_);
-      text_.clear();
+      *value = PlistBuilder::text(Kind::kString, arena_.copyText(text_));
       return true;
     case Element::kInteger:
-      value->kind = Kind::kInteger;
-      return parsePlistInteger(text_, &value->integer);
+      if (!parsePlistInteger(text_, &number)) return false;
+      *value = PlistBuilder::number(Kind::kInteger, number);
+      return true;
     case Element::kReal:
-      value->kind = Kind::kReal;
-      return parsePlistReal(text_, &value->real);
+      if (!parsePlistReal(text_, &real)) return false;
+      *value = PlistBuilder::real(real);
+      return true;
     case Element::kDate:
-      value->kind = Kind::kDate;
-      return parsePlistDate(text_, &value->integer);
+      if (!parsePlistDate(text_, &number)) return false;
+      *value = PlistBuilder::number(Kind::kDate, number);
+      return true;
     case Element::kTrue:
     case Element::kFalse:
-      value->kind = Kind::kBoolean;
-      value->integer = leaf_ == Element::kTrue ? 1 : 0;
+      *value = PlistBuilder::number(Kind::kBoolean, leaf_ == Element::kTrue ? 1 : 0);
       return text_.empty();
     case Element::kData:
-      value->kind = Kind::kData;
       // "<data/>" is refused where "<data></data>" is empty data; expat
       // reports no bytes for the end of an empty-element tag.
-      return XML_GetCurrentByteCount(parser_) != 0 && decodePlistBase64(text_, &value->text);
+      decoded_.clear();
+      if (XML_GetCurrentByteCount(parser_) == 0 || !decodePlistBase64(text_, &decoded_))
+        return false;
+      *value = PlistBuilder::text(Kind::kData, arena_.copyText(decoded_));
+      return true;
     default:
       return false;
   }
@@ -308,7 +401,7 @@ void Reader::end() {
     return;
   }
   if (stack_.empty()) return;  // </plist>
-  attach(stack_.pop());
+  attach(stack_.pop(arena_));
 }
 
 void XMLCALL Reader::onStart(void* self, const XML_Char* name, const XML_Char**) {
@@ -335,7 +428,7 @@ struct ParserFree {
   void operator()(XML_Parser parser) const { XML_ParserFree(parser); }
 };
 
-bool Reader::read(std::string_view document, PlistValue* out, std::string* warning) {
+bool Reader::read(std::string_view document, Plist* out, std::string* warning) {
   std::string storage;
   const std::string_view cleaned = escapeRefusedBytes(document, &storage);
   // The declared encoding is overridden: the cleaning works on UTF-8 bytes.
@@ -367,22 +460,22 @@ bool Reader::read(std::string_view document, PlistValue* out, std::string* warni
     in_leaf_ = false;
     ignored_ = 0;
     while (!stack_.empty()) {
-      attach(stack_.pop());
+      attach(stack_.pop(arena_));
     }
   }
   parser_ = nullptr;
   if (warning) *warning = warning_;
   if (!root_done_) {
-    *out = PlistValue();
+    *out = Plist();
     return false;
   }
-  *out = std::move(root_);
+  PlistBuilder::take(root_, std::move(arena_), out);
   return true;
 }
 
 }  // namespace
 
-bool parsePlist(std::string_view document, PlistValue* out, std::string* warning) {
+bool parsePlist(std::string_view document, Plist* out, std::string* warning) {
   Reader reader;
   return reader.read(document, out, warning);
 }

@@ -76,6 +76,41 @@ bool isXmlChar(uint32_t cp) {
   return cp <= 0x10FFFF;
 }
 
+// A control character that expat refuses even as a reference.
+bool isRefusedControl(uint32_t cp) { return cp < 0x20 && cp != '\t' && cp != '\n' && cp != '\r'; }
+
+// Length of the character reference ("&#65;", "&#x41;") at p, with its
+// value, or 0 when there is none.
+size_t characterReference(const unsigned char* p, size_t n, uint32_t* value) {
+  if (n < 2 || p[0] != '&' || p[1] != '#') return 0;
+  size_t j = 2;
+  bool hex = j < n && p[j] == 'x';
+  if (hex) ++j;
+  uint32_t number = 0;
+  size_t digits = 0;
+  for (unsigned d = 0; j < n && digits <= 8 && digitValue(p[j], hex, &d); ++j, ++digits)
+    number = number * (hex ? 16 : 10) + d;
+  if (digits == 0 || digits > 8 || j >= n || p[j] != ';') return 0;
+  *value = number;
+  return j + 1;
+}
+
+// Length of the reference at p when it passes through as it is (a
+// predefined entity, or a character expat takes outside our private
+// range), else 0.
+size_t keptReferenceLength(const unsigned char* p, size_t n) {
+  static constexpr std::string_view kPredefined[] = {"&lt;", "&gt;", "&amp;", "&apos;", "&quot;"};
+  for (std::string_view name : kPredefined) {
+    if (n >= name.size() && std::memcmp(p, name.data(), name.size()) == 0) return name.size();
+  }
+  uint32_t value = 0;
+  size_t len = characterReference(p, n, &value);
+  if (len == 0 || isRefusedControl(value) || (value >= kEscapeBase && value <= kPrivateLast) ||
+      !isXmlChar(value))
+    return 0;
+  return len;
+}
+
 // Bytes that pass through character data unchanged and end no state: most
 // of a document. Runs of them are skipped, or copied, in one step.
 struct PlainBytes {
@@ -92,6 +127,75 @@ struct PlainBytes {
   }
 };
 constexpr PlainBytes kPlain;
+
+// Bytes after which the cleaning might change something, wherever they
+// stand: control bytes (CR too), bytes outside ASCII, references and the
+// "]" of a "]]>".
+struct SuspectBytes {
+  bool suspect[256] = {};
+  constexpr SuspectBytes() {
+    for (int c = 0; c < 0x20; ++c) suspect[c] = c != '\t' && c != '\n';
+    for (int c = 0x80; c < 0x100; ++c) suspect[c] = true;
+    suspect[static_cast<unsigned char>('&')] = true;
+    suspect[static_cast<unsigned char>(']')] = true;
+  }
+};
+constexpr SuspectBytes kSuspect;
+
+// Whether any of the kBlock bytes at p is suspect, 16 bytes per compare
+// through the vector types GCC and Clang share: this runs over nearly every
+// byte of a profiler document, and a table lookup per byte cost most of the
+// time saved by skipping the cleaning's walk.
+typedef unsigned char Bytes16 __attribute__((vector_size(16)));
+typedef signed char SignedBytes16 __attribute__((vector_size(16)));
+constexpr size_t kBlock = 64;
+
+bool blockHoldsSuspectByte(const unsigned char* p) {
+  Bytes16 suspect = {};
+  for (size_t k = 0; k < kBlock; k += sizeof(Bytes16)) {
+    Bytes16 b;
+    std::memcpy(&b, p + k, sizeof b);
+    // Below 0x20 as a signed byte: the control bytes and every byte past
+    // ASCII. Tab and LF are among them and are taken out again.
+    const Bytes16 control =
+        (Bytes16)((SignedBytes16)b < 0x20) ^ (Bytes16)(b == '\t') ^ (Bytes16)(b == '\n');
+    suspect |= control | (Bytes16)(b == '&') | (Bytes16)(b == ']');
+  }
+  uint64_t halves[2];
+  std::memcpy(halves, &suspect, sizeof halves);
+  return (halves[0] | halves[1]) != 0;
+}
+
+// True when the cleaning certainly leaves p[0..n) as it is: no control
+// byte, only well-formed UTF-8 outside our private range, only references
+// that pass through and no "]]>". This holds for nearly every profiler
+// document, and a run over plain bytes with no state to follow costs far
+// less than the cleaning's walk from markup to text at every tag. Anything
+// in doubt is left to the cleaning.
+bool surelyUnchanged(const unsigned char* p, size_t n) {
+  size_t i = 0;
+  for (;;) {
+    while (n - i >= kBlock && !blockHoldsSuspectByte(p + i)) i += kBlock;
+    while (i < n && !kSuspect.suspect[p[i]]) ++i;
+    if (i == n) return true;
+    unsigned char c = p[i];
+    if (c >= 0x80) {
+      uint32_t cp = 0;
+      size_t len = sequenceLength(p + i, n - i, &cp);
+      if (len == 0 || (cp >= kEscapeBase && cp <= kPrivateLast)) return false;
+      i += len;
+    } else if (c == '&') {
+      size_t len = keptReferenceLength(p + i, n - i);
+      if (len == 0) return false;
+      i += len;
+    } else if (c == ']') {
+      if (n - i >= 3 && p[i + 1] == ']' && p[i + 2] == '>') return false;
+      ++i;
+    } else {
+      return false;
+    }
+  }
+}
 
 // Most documents need no escaping at all: the output is then the input
 // itself, and nothing is copied until the first byte that changes.
@@ -171,37 +275,21 @@ void Cleaner::copyContentByte(bool escape_cr) {
 }
 
 void Cleaner::copyReference() {
-  static const char* const kPredefined[] = {"&lt;", "&gt;", "&amp;", "&apos;", "&quot;"};
-  for (const char* name : kPredefined) {
-    if (startsWith(name)) {
-      copy(std::strlen(name));
+  if (size_t len = keptReferenceLength(p_ + i_, n_ - i_)) {
+    copy(len);
+    return;
+  }
+  uint32_t value = 0;
+  if (size_t len = characterReference(p_ + i_, n_ - i_, &value)) {
+    if (isRefusedControl(value)) {
+      appendEscapedByte(change(), static_cast<unsigned char>(value));
+      i_ += len;
       return;
     }
-  }
-  if (startsWith("&#")) {
-    size_t j = i_ + 2;
-    bool hex = j < n_ && p_[j] == 'x';
-    if (hex) ++j;
-    uint32_t value = 0;
-    size_t digits = 0;
-    for (unsigned d = 0; j < n_ && digits <= 8 && digitValue(p_[j], hex, &d); ++j, ++digits)
-      value = value * (hex ? 16 : 10) + d;
-    if (digits > 0 && digits <= 8 && j < n_ && p_[j] == ';') {
-      size_t len = j + 1 - i_;
-      if (value < 0x20 && value != '\t' && value != '\n' && value != '\r') {
-        appendEscapedByte(change(), static_cast<unsigned char>(value));
-        i_ += len;
-        return;
-      }
-      if (value >= kEscapeBase && value <= kPrivateLast) {
-        appendEscapedCodePoint(change(), value);
-        i_ += len;
-        return;
-      }
-      if (isXmlChar(value)) {
-        copy(len);
-        return;
-      }
+    if (value >= kEscapeBase && value <= kPrivateLast) {
+      appendEscapedCodePoint(change(), value);
+      i_ += len;
+      return;
     }
   }
   // Anything else makes CoreFoundation refuse the value: mark it and let the
@@ -218,6 +306,8 @@ std::string_view Cleaner::run(std::string* storage) {
     ++lead;
   if (lead > 0 && n_ - lead >= 5 && std::memcmp(p_ + lead, "<?xml", 5) == 0) i_ = lead;
   start_ = i_;
+  if (surelyUnchanged(p_ + start_, n_ - start_))
+    return std::string_view(reinterpret_cast<const char*>(p_ + start_), n_ - start_);
 
   State state = State::kText;
   bool root_started = false;

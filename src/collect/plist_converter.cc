@@ -4,7 +4,7 @@
 #include <cstdio>
 #include <ctime>
 #include <deque>
-#include <type_traits>
+#include <optional>
 #include <utility>
 #include <vector>
 
@@ -18,40 +18,35 @@ namespace {
 // the stack on a hand-made value.
 constexpr size_t kMaxDepth = 512;
 
-bool isSkippedDataType(const std::string& name) {
+bool isSkippedDataType(std::string_view name) {
   return name == "SPLogsDataType" || name == "SPFontsDataType";
 }
 
-bool isSkippedTopKey(const std::string& key) {
+bool isSkippedTopKey(std::string_view key) {
   return key == "_dataType" || key == "_detailLevel" || key == "_properties";
 }
 
-bool isNamedListKey(const std::string& key) {
+bool isNamedListKey(std::string_view key) {
   return key == "spfirewall_applications" || key == "spfirewall_services";
 }
 
-// A list being taken apart gives its text away.
-TagValue textOf(const PlistValue& value) { return TagValue(value.text); }
-TagValue textOf(PlistValue& value) { return TagValue(std::move(value.text)); }
-
 // Nothing (type none) for the kinds that store nothing.
-template <typename Value>
-TagValue leafValue(Value& value, bool top_level) {
-  switch (value.kind) {
+TagValue leafValue(const PlistValue& value, bool top_level) {
+  switch (value.kind()) {
     case PlistValue::Kind::kString:
-      return textOf(value);
+      return TagValue(value.text());
     case PlistValue::Kind::kInteger:
       if (top_level) {
         char buf[32];
-        std::snprintf(buf, sizeof buf, "%lld", static_cast<long long>(value.integer));
+        std::snprintf(buf, sizeof buf, "%lld", static_cast<long long>(value.integer()));
         return TagValue(buf);
       }
-      return TagValue(value.integer);
+      return TagValue(value.integer());
     case PlistValue::Kind::kReal:
-      return TagValue(value.real);
+      return TagValue(value.real());
     case PlistValue::Kind::kDate: {
       // The zone was read once when the conversion began.
-      std::string text = formatLocalDateInCurrentZone(value.integer, true);
+      std::string text = formatLocalDateInCurrentZone(value.integer(), true);
       if (text.empty()) return TagValue();
       return TagValue(std::move(text));
     }
@@ -159,25 +154,17 @@ void PlistConverter::chainFor(std::string_view path, std::deque<Node>& chain) {
   }
 }
 
-void PlistConverter::convertPlist(const PlistValue& root) { convertRoot(root); }
-
-void PlistConverter::convertPlist(PlistValue&& root) {
-  convertRoot(root);
-  root = PlistValue();
-}
-
-template <typename Value>
-void PlistConverter::convertRoot(Value& root) {
+void PlistConverter::convertPlist(const PlistValue& root) {
   if (!root.isArray()) return;
   tzset();
-  for (auto& element : root.array) {
+  for (const PlistValue& element : root.items()) {
     if (!element.isDictionary()) continue;
-    const std::string* data_type = element.findText("_dataType");
+    std::optional<std::string_view> data_type = element.findText("_dataType");
     if (!data_type || isSkippedDataType(*data_type)) continue;
     std::deque<Node> chain;
-    chainFor("/" + *data_type, chain);
+    chainFor("/" + std::string(*data_type), chain);
     Node& base = chain.back();
-    for (auto& entry : element.dictionary) {
+    for (const PlistEntry& entry : element.entries()) {
       if (isSkippedTopKey(entry.key)) continue;
       std::string key = sanitizeKey(entry.key);
       if (entry.value.isDictionary() || entry.value.isArray()) {
@@ -210,8 +197,8 @@ void PlistConverter::convertNamedList(const PlistValue& dictionary, std::string_
   walkNamedList(dictionary, chain.back());
 }
 
-template <typename Value>
-void PlistConverter::walkValue(Value& value, Node& parent, std::string name, size_t depth) {
+void PlistConverter::walkValue(const PlistValue& value, Node& parent, std::string name,
+                               size_t depth) {
   if (value.isDictionary() || value.isArray()) {
     if (depth >= kMaxDepth) return;
     Node child;
@@ -227,10 +214,9 @@ void PlistConverter::walkValue(Value& value, Node& parent, std::string name, siz
   parent.store(name, leafValue(value, false));
 }
 
-template <typename Value>
-void PlistConverter::walkDictionary(Value& dictionary, Node& node, size_t depth) {
+void PlistConverter::walkDictionary(const PlistValue& dictionary, Node& node, size_t depth) {
   if (!dictionary.isDictionary()) return;
-  for (auto& entry : dictionary.dictionary) {
+  for (const PlistEntry& entry : dictionary.entries()) {
     if (entry.value.isDictionary() && isNamedListKey(entry.key)) {
       Node child;
       child.parent = &node;
@@ -242,27 +228,22 @@ void PlistConverter::walkDictionary(Value& dictionary, Node& node, size_t depth)
   }
 }
 
-template <typename Value>
-void PlistConverter::walkArray(Value& array, Node& node, size_t depth) {
+void PlistConverter::walkArray(const PlistValue& array, Node& node, size_t depth) {
   if (!array.isArray()) return;
-  for (size_t i = 0; i < array.array.size(); ++i) {
-    walkValue(array.array[i], node, "item" + std::to_string(i), depth);
-    // Taking apart: the item's tag holds everything it had.
-    if constexpr (!std::is_const_v<Value>) array.array[i] = PlistValue();
-  }
+  for (size_t i = 0; i < array.items().size(); ++i)
+    walkValue(array.items()[i], node, "item" + std::to_string(i), depth);
 }
 
-template <typename Value>
-void PlistConverter::walkNamedList(Value& dictionary, Node& node) {
+void PlistConverter::walkNamedList(const PlistValue& dictionary, Node& node) {
   if (!dictionary.isDictionary()) return;
-  for (size_t i = 0; i < dictionary.dictionary.size(); ++i) {
-    auto& entry = dictionary.dictionary[i];
+  for (size_t i = 0; i < dictionary.entries().size(); ++i) {
+    const PlistEntry& entry = dictionary.entries()[i];
     if (!entry.value.isString()) continue;  // its number stays used
     Node item;
     item.parent = &node;
     item.name = "item" + std::to_string(i);
     item.store("_name", TagValue(entry.key));
-    item.store("value", textOf(entry.value));
+    item.store("value", TagValue(entry.value.text()));
   }
 }
 

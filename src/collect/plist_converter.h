@@ -25,10 +25,6 @@ class PlistConverter {
   /// "SPFontsDataType" are skipped. Anything that is not an array gives
   /// nothing.
   void convertPlist(const PlistValue& root);
-  /// The same, taking the list apart on the way: values move into their
-  /// tags and each array item is freed once converted, so the list and the
-  /// tree are not both whole in memory at once.
-  void convertPlist(PlistValue&& root);
 
   /// The walkers store the leaves of `value` below `path` ("/a/b" starts at
   /// the top tag, as TagTree::setValue reads it). Integers become 64-bit
@@ -46,18 +42,11 @@ class PlistConverter {
  private:
   struct Node;
 
-  // `Value` is const PlistValue when reading, PlistValue when taking apart.
   void chainFor(std::string_view path, std::deque<Node>& chain);
-  template <typename Value>
-  void convertRoot(Value& root);
-  template <typename Value>
-  void walkValue(Value& value, Node& parent, std::string name, size_t depth);
-  template <typename Value>
-  void walkDictionary(Value& dictionary, Node& node, size_t depth);
-  template <typename Value>
-  void walkArray(Value& array, Node& node, size_t depth);
-  template <typename Value>
-  void walkNamedList(Value& dictionary, Node& node);
+  void walkValue(const PlistValue& value, Node& parent, std::string name, size_t depth);
+  void walkDictionary(const PlistValue& dictionary, Node& node, size_t depth);
+  void walkArray(const PlistValue& array, Node& node, size_t depth);
+  void walkNamedList(const PlistValue& dictionary, Node& node);
 
   TagTree& tree_;
 };

@@ -50,12 +50,11 @@ bool isExtraType(std::string_view data_type) {
 }
 
 std::string_view dataTypeOf(const PlistValue& element) {
-  const PlistValue* name = element.find("_dataType");
-  return name && name->isString() ? std::string_view(name->text) : std::string_view();
+  return element.findText("_dataType").value_or(std::string_view());
 }
 
 bool holdsDataType(const PlistValue& root, std::string_view data_type) {
-  for (const PlistValue& element : root.array) {
+  for (const PlistValue& element : root.items()) {
     if (dataTypeOf(element) == data_type) return true;
   }
   return false;
@@ -132,33 +131,32 @@ std::vector<std::string> ProfilerCollector::collectExtraTypes() {
   return documents;
 }
 
-void addExtraTypes(const std::vector<std::string>& documents, PlistValue* root) {
+void addExtraTypes(const std::vector<std::string>& documents, Plist* root) {
   for (const std::string& document : documents) {
-    PlistValue list;
+    Plist list;
     if (!parsePlist(document, &list) || !list.isArray()) continue;
-    for (PlistValue& element : list.array) {
+    std::vector<const PlistValue*> taken;
+    for (const PlistValue& element : list.items()) {
       std::string_view data_type = dataTypeOf(element);
       if (!element.isDictionary() || !isExtraType(data_type)) continue;
-      if (!root->isArray()) {
-        // The main document could not be read at all.
-        *root = PlistValue();
-        root->kind = PlistValue::Kind::kArray;
-      }
-      if (holdsDataType(*root, data_type)) continue;
-      root->array.push_back(std::move(element));
+      // A main document that could not be read at all holds nothing.
+      if (root->isArray() && holdsDataType(*root, data_type)) continue;
+      bool repeated = false;
+      for (const PlistValue* other : taken) repeated = repeated || dataTypeOf(*other) == data_type;
+      if (!repeated) taken.push_back(&element);
     }
+    if (!taken.empty()) root->appendItems(taken, std::move(list));
   }
 }
 
 bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
-                            PlistValue* out, std::string* warning) {
+                            Plist* out, std::string* warning) {
   std::string problem;
   bool read = parsePlist(document, out, &problem);
   if (warning) *warning = problem;
   if (problem.empty() || part_ends.size() < 2) return read;
 
-  PlistValue merged;
-  merged.kind = PlistValue::Kind::kArray;
+  Plist merged;
   size_t start = 0;
   for (size_t i = 0; i < part_ends.size(); ++i) {
     size_t end = part_ends[i] < document.size() ? part_ends[i] : document.size();
@@ -170,11 +168,13 @@ bool parseCollectedDocument(std::string_view document, const std::vector<size_t>
     piece += document.substr(start, end - start);
     if (i + 1 != part_ends.size()) piece += kProfilerFooter;
     start = end;
-    PlistValue value;
+    Plist value;
     if (!parsePlist(piece, &value) || !value.isArray()) continue;
-    for (PlistValue& element : value.array) merged.array.push_back(std::move(element));
+    std::vector<const PlistValue*> elements;
+    for (const PlistValue& element : value.items()) elements.push_back(&element);
+    merged.appendItems(elements, std::move(value));
   }
-  if (merged.array.empty()) return read;
+  if (merged.items().empty()) return read;
   *out = std::move(merged);
   return true;
 }

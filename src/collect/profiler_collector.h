@@ -43,7 +43,7 @@ class ProfilerCollector {
   CommandRunner& runner_;
 };
 
-struct PlistValue;
+class Plist;
 
 /// Parses the spliced document as one property list. When that reports a
 /// problem (one data type's output was malformed or broke off), each data
@@ -52,13 +52,13 @@ struct PlistValue;
 /// be read. `warning`, when given, receives the whole document's first
 /// problem.
 bool parseCollectedDocument(std::string_view document, const std::vector<size_t>& part_ends,
-                            PlistValue* out, std::string* warning = nullptr);
+                            Plist* out, std::string* warning = nullptr);
 
 /// Appends to the profiler list `root` the data type dictionaries of the
 /// documents of collectExtraTypes, each only when it is one of the types
 /// asked for there and `root` does not hold that type yet. Unreadable documents
 /// are passed over.
-void addExtraTypes(const std::vector<std::string>& documents, PlistValue* root);
+void addExtraTypes(const std::vector<std::string>& documents, Plist* root);
 
 }  // namespace cvn
 

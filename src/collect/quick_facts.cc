@@ -51,7 +51,7 @@ void readDisplays(const PlistValue& root, QuickFacts* facts) {
   const PlistValue* items = findProfilerItems(root, "SPDisplaysDataType");
   if (!items) return;
   bool have_vram = false;
-  for (const PlistValue& adapter : items->array) {
+  for (const PlistValue& adapter : items->items()) {
     if (!have_vram) {
       std::string vram = adapter.textAt("spdisplays_vram");
       if (vram.empty()) vram = adapter.textAt("spdisplays_vram_shared");
@@ -62,7 +62,7 @@ void readDisplays(const PlistValue& root, QuickFacts* facts) {
     }
     const PlistValue* displays = adapter.findArray("spdisplays_ndrvs");
     if (!displays) continue;
-    for (const PlistValue& display : displays->array) {
+    for (const PlistValue& display : displays->items()) {
       if (display.textAt("spdisplays_main") != "spdisplays_yes") continue;
       facts->main_display_resolution = displayResolution(display);
       facts->main_display_edid = display.textAt("_spdisplays_edid");
@@ -83,17 +83,17 @@ void readDisks(const PlistValue& root, QuickFacts* facts) {
   for (const auto& [data_type, with_volumes] : kDiskTypes) {
     const PlistValue* controllers = findProfilerItems(root, data_type);
     if (!controllers) continue;
-    for (const PlistValue& controller : controllers->array) {
+    for (const PlistValue& controller : controllers->items()) {
       const PlistValue* devices = controller.findArray("_items");
       if (!devices) continue;
-      for (const PlistValue& device : devices->array) {
+      for (const PlistValue& device : devices->items()) {
         std::string size = device.textAt("size");
         if (size.empty()) continue;
         disks += SizeText::toGigabytes(size);
         any_disk = true;
         const PlistValue* vols = with_volumes ? device.findArray("volumes") : nullptr;
         if (!vols) continue;
-        for (const PlistValue& volume : vols->array) {
+        for (const PlistValue& volume : vols->items()) {
           volumes += SizeText::toGigabytes(volume.textAt("size"));
           free += SizeText::toGigabytes(volume.textAt("free_space"));
           any_volume = true;
@@ -126,8 +126,8 @@ QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
   facts.platform_uuid = runner.run(kPlatformUuidCommand, 40);
   if (facts.platform_uuid.empty()) facts.platform_uuid = hardware.textAt("platform_UUID");
   const PlistValue* packages = hardware.find("packages");
-  if (packages && packages->kind == PlistValue::Kind::kInteger) {
-    facts.package_count = std::to_string(static_cast<unsigned>(packages->integer));
+  if (packages && packages->kind() == PlistValue::Kind::kInteger) {
+    facts.package_count = std::to_string(static_cast<unsigned>(packages->integer()));
   } else if (!packages && hardware.find("chip_type")) {
     // One chip, as the Processors section records it.
     facts.package_count = "1";

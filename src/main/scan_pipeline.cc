@@ -60,21 +60,23 @@ ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part
   std::string ip = request.ip;
   // A document that cannot be read leaves the trees without profiler data;
   // the scan still writes its file.
-  PlistValue plist;
+  Plist plist;
   parseCollectedDocument(document, part_ends, &plist, &result.parse_warning);
   addExtraTypes(extra_documents, &plist);
-  document = std::string();
-  extra_documents.clear();
+  // Swapped out rather than assigned: assigning an empty string keeps the
+  // document's whole buffer allocated.
+  std::string().swap(document);
+  std::vector<std::string>().swap(extra_documents);
 
   QuickFacts facts = readQuickFacts(plist, sources.runner);
-  // Read before the conversion, which takes the list apart so that the list
-  // and the raw tree are never both whole in memory.
   NetworkIdentity identity;
   readNetworkIdentity(plist, ip, &identity);
   std::string serial = readSerialNumber(plist);
   auto raw = std::make_unique<TagTree>(request.native, "Macintosh");
   logStage(request, "II. Parsing Data....");
-  PlistConverter(*raw).convertPlist(std::move(plist));
+  PlistConverter(*raw).convertPlist(plist);
+  // The list and the raw tree are both whole only until here.
+  plist = Plist();
   logStage(request, "done\n");
   logStage(request, "III. Get Data For AssetInfo....");
   logStage(request, "33% ");
@@ -114,11 +116,11 @@ ScanResult runDebugPipeline(const std::string& document, const ScanRequest& requ
                             const ScanSources& sources) {
   ScanResult result;
   std::string ip = request.ip;
-  PlistValue plist;
+  Plist plist;
   parsePlist(document, &plist, &result.parse_warning);
   NetworkIdentity identity;
   readNetworkIdentity(plist, ip, &identity);
-  plist = PlistValue();
+  plist = Plist();
 
   uint8_t tree_flag = request.native ? 1 : 0;
   SnapshotFile file(request.native);

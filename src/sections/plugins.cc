@@ -1,4 +1,5 @@
 #include <initializer_list>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -32,15 +33,14 @@ std::string nameFromFolder(const std::string& folder) {
 
 std::string firstString(const PlistValue& info, std::initializer_list<std::string_view> keys) {
   for (std::string_view key : keys) {
-    const std::string* text = info.findText(key);
-    if (text && !text->empty()) return *text;
+    std::optional<std::string_view> text = info.findText(key);
+    if (text && !text->empty()) return std::string(*text);
   }
   return std::string();
 }
 
 // Binary property lists go through plutil first: our reader takes XML only.
-bool readInfoPlist(FileSystem& fs, CommandRunner& runner, const std::string& path,
-                   PlistValue* info) {
+bool readInfoPlist(FileSystem& fs, CommandRunner& runner, const std::string& path, Plist* info) {
   std::string bytes;
   if (!fs.readFile(path, kMaxInfoPlistBytes, &bytes) || bytes.empty()) return false;
   if (bytes.compare(0, 6, "bplist") == 0)
@@ -52,7 +52,7 @@ BundleInfo readBundle(FileSystem& fs, CommandRunner& runner, const std::string& 
                       const std::string& folder, const std::vector<std::string>& plist_paths) {
   BundleInfo bundle;
   for (const std::string& relative : plist_paths) {
-    PlistValue info;
+    Plist info;
     if (!readInfoPlist(fs, runner, bundle_path + relative, &info)) continue;
     bundle.name = firstString(info, {"CFBundleName"});
     bundle.version = firstString(info, {"CFBundleShortVersionString", "CFBundleVersion"});
