@@ -34,7 +34,9 @@ bool isNamedListKey(std::string_view key) {
 TagValue leafValue(const PlistValue& value, bool top_level) {
   switch (value.kind()) {
     case PlistValue::Kind::kString:
-      return TagValue(value.text());
+      // The list outlives the conversion, so the tree copies the text
+      // straight from it.
+      return TagValue::viewOf(value.text());
     case PlistValue::Kind::kInteger:
       if (top_level) {
         char buf[32];
@@ -242,8 +244,8 @@ void PlistConverter::walkNamedList(const PlistValue& dictionary, Node& node) {
     Node item;
     item.parent = &node;
     item.name = "item" + std::to_string(i);
-    item.store("_name", TagValue(entry.key));
-    item.store("value", TagValue(entry.value.text()));
+    item.store("_name", TagValue::viewOf(entry.key));
+    item.store("value", TagValue::viewOf(entry.value.text()));
   }
 }
 

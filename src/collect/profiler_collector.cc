@@ -79,12 +79,17 @@ std::string ProfilerCollector::runProfiler(std::string_view data_type, Trim trim
       if (output.size() < foot + 1) return std::string();
       output.resize(output.size() - foot);
       return output;
+    // Trimmed in place: the applications' output can be most of the
+    // document, and a trimmed copy would hold it twice.
     case Trim::kMiddle:
       if (output.size() < head + foot + 1) return std::string();
-      return output.substr(head, output.size() - head - foot);
+      output.resize(output.size() - foot);
+      output.erase(0, head);
+      return output;
     case Trim::kLast:
       if (output.size() < head + 1) return std::string();
-      return output.substr(head);
+      output.erase(0, head);
+      return output;
   }
   return std::string();
 }
