@@ -24,22 +24,7 @@ class PlistBuilder;
 
 /// A read-only view of a list of values or entries in a parsed list.
 template <typename T>
-class PlistRange {
- public:
-  constexpr PlistRange() = default;
-  constexpr PlistRange(const T* data, size_t size) : data_(data), size_(size) {}
-
-  const T* begin() const { return data_; }
-  const T* end() const { return data_ + size_; }
-  size_t size() const { return size_; }
-  bool empty() const { return size_ == 0; }
-  const T& operator[](size_t i) const { return data_[i]; }
-  const T& front() const { return data_[0]; }
-
- private:
-  const T* data_ = nullptr;
-  size_t size_ = 0;
-};
+using PlistRange = ArenaRange<const T>;
 
 /// One property-list value. Dictionaries keep their keys in document order
 /// (a repeated key keeps its first position and takes the last value).

@@ -12,6 +12,7 @@
 #include <cstdint>
 #include <new>
 #include <string_view>
+#include <type_traits>
 #include <utility>
 
 namespace cvn {
@@ -70,6 +71,29 @@ class Arena {
   char* limit_ = nullptr;
   size_t next_block_ = 0;
   size_t reserved_ = 0;
+};
+
+/// A list of items kept in an arena, read like a vector. `T` is const for
+/// a list its reader may not change.
+template <typename T, typename Size = size_t>
+class ArenaRange {
+ public:
+  using Item = std::remove_const_t<T>;
+
+  constexpr ArenaRange() = default;
+  constexpr ArenaRange(T* data, Size size) : data_(data), size_(size) {}
+
+  const Item* begin() const { return data_; }
+  const Item* end() const { return data_ + size_; }
+  size_t size() const { return size_; }
+  bool empty() const { return size_ == 0; }
+  const Item& operator[](size_t i) const { return data_[i]; }
+  const Item& front() const { return data_[0]; }
+  const Item& back() const { return data_[size_ - 1]; }
+
+ protected:
+  T* data_ = nullptr;
+  Size size_ = 0;
 };
 
 inline void* Arena::allocate(size_t size, size_t alignment) {

@@ -63,18 +63,20 @@ const TagList<Annotation> kNoAnnotations;
 
 template <typename T>
 void TagList<T>::push(TagStore& store, const T& item) {
-  if (size_ == capacity_) {
+  if (this->size_ == capacity_) {
     if (capacity_ == UINT32_MAX) throw std::bad_alloc();
     uint32_t capacity = capacity_ == 0               ? 4
                         : capacity_ > UINT32_MAX / 2 ? UINT32_MAX
                                                      : capacity_ * 2;
     T* data = static_cast<T*>(store.arena().allocate(sizeof(T) * capacity, alignof(T)));
-    if (size_) std::memcpy(static_cast<void*>(data), data_, sizeof(T) * size_);
-    data_ = data;
+    if (this->size_) std::memcpy(static_cast<void*>(data), this->data_, sizeof(T) * this->size_);
+    this->data_ = data;
     capacity_ = capacity;
   }
-  data_[size_++] = item;
+  this->data_[this->size_++] = item;
 }
+
+static_assert(sizeof(TagList<Tag*>) == 16, "a list is a pointer and two counts");
 
 template class TagList<Tag*>;
 template class TagList<TagProperty*>;
@@ -310,7 +312,7 @@ void TagProperty::setAnnotation(std::string_view key, std::string_view text) {
   if (annotations_) {
     for (size_t i = 0; i < annotations_->size(); ++i) {
       if ((*annotations_)[i].key == key) {
-        annotations_->data_[i].text = store_->text(text);
+        annotations_->at(i).text = store_->text(text);
         return;
       }
     }

@@ -14,6 +14,8 @@
 #include <type_traits>
 #include <vector>
 
+#include "zxml/arena.h"
+
 namespace cvn {
 
 class TagStore;
@@ -117,26 +119,16 @@ struct Annotation {
 /// the old room behind in the arena, so the total stays within twice the
 /// final size.
 template <typename T>
-class TagList {
+class TagList : public ArenaRange<T, uint32_t> {
   static_assert(std::is_trivially_copyable_v<T>, "a tree's lists hold plain items");
-
- public:
-  const T* begin() const { return data_; }
-  const T* end() const { return data_ + size_; }
-  size_t size() const { return size_; }
-  bool empty() const { return size_ == 0; }
-  const T& operator[](size_t i) const { return data_[i]; }
-  const T& front() const { return data_[0]; }
-  const T& back() const { return data_[size_ - 1]; }
 
  private:
   friend class Tag;
   friend class TagProperty;
   void push(TagStore& store, const T& item);
-  void clear() { size_ = 0; }
+  void clear() { this->size_ = 0; }
+  T& at(size_t i) { return this->data_[i]; }
 
-  T* data_ = nullptr;
-  uint32_t size_ = 0;
   uint32_t capacity_ = 0;
 };
 
