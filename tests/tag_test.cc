@@ -58,5 +58,71 @@ TEST(TagTest, NumberedNamesFillTheFirstGap) {
   EXPECT_EQ(tag.children().size(), 40u);
 }
 
+// Values move between trees and the stack; each copy must hold its own
+// text whatever kind of storage the text came from. Under AddressSanitizer
+// a copy that still pointed into a dropped tree or string would fail here.
+TEST(TagTest, ValuesOwnTheirTextsWhereverTheyCameFrom) {
+  const std::string long_text(40, 'x');
+  TagValue copied_out;
+  TagValue copied_short;
+  {
+    TagTree tree(true, "Snapshot");
+    tree.top().setProperty("long", TagValue(long_text));
+    tree.top().setProperty("short", TagValue("abc"));
+    copied_out = tree.top().findProperty("long")->value();
+    copied_short = tree.top().findProperty("short")->value();
+  }
+  EXPECT_EQ(copied_out.text(), long_text);
+  EXPECT_EQ(copied_short.text(), "abc");
+
+  std::string source = long_text;
+  TagValue view = TagValue::viewOf(source);
+  TagValue owned = view;
+  source.assign(40, 'y');
+  EXPECT_EQ(owned.text(), long_text);
+
+  TagValue self(long_text);
+  const TagValue& same = self;
+  self = same;
+  EXPECT_EQ(self.text(), long_text);
+  TagValue moved(std::move(self));
+  EXPECT_EQ(moved.text(), long_text);
+  // A none value assigned over text changes nothing.
+  moved = TagValue();
+  EXPECT_EQ(moved.text(), long_text);
+}
+
+// Past the index threshold lookups go through the index; it must keep the
+// first of equal names, also across the index's growth, as the short
+// list's front-to-back search does.
+TEST(TagTest, LargeListsKeepTheFirstOfEqualNames) {
+  // Three children of one name: appending copies, unlike adding, keeps them.
+  TagTree source(true, "Source");
+  Tag& model = source.top().addChild("model").addChild("twin");
+  for (int i = 0; i < 3; ++i) {
+    model.setValue(TagValue(i));
+    source.top().appendCopyOf(model);
+  }
+  TagTree tree(true, "Copy");
+  Tag& top = tree.top();
+  for (int round = 0; round < 200; ++round)
+    top.appendCopyOf(*source.top().children()[1 + round % 3]);
+  for (int i = 0; i < 100; ++i)
+    top.addChild("child" + std::to_string(i)).setProperty("n", TagValue(i));
+  EXPECT_EQ(top.children().size(), 300u);
+  EXPECT_EQ(top.findChild("twin"), top.children()[0]);
+  EXPECT_EQ(top.findChild("twin")->value()->asInt(), 0);
+  EXPECT_EQ(top.findChild("child99"), top.children()[299]);
+  EXPECT_EQ(top.findChild("child"), nullptr);
+  for (int i = 0; i < 40; ++i) top.setProperty("p" + std::to_string(i % 20), TagValue(i));
+  EXPECT_EQ(top.properties().size(), 20u);
+  EXPECT_EQ(top.findProperty("p3")->value().asInt(), 23);
+
+  // A deep copy of the whole tree keeps the duplicates and their order.
+  TagTree copy(tree);
+  EXPECT_EQ(copy.top().children().size(), 300u);
+  EXPECT_EQ(copy.top().children()[1]->value()->asInt(), 1);
+}
+
 }  // namespace
 }  // namespace cvn
