@@ -168,7 +168,11 @@ void TagValue::copyFrom(const TagValue& other) {
   type_ = other.type_;
   storage_ = Storage::kInline;
   size_ = 0;
-  int_ = other.int_;  // also carries a real's bits
+  if (other.isReal()) {
+    real_ = other.real_;
+  } else {
+    int_ = other.int_;
+  }
 }
 
 TagValue TagValue::storedIn(const TagValue& value, TagStore& store) {
