@@ -156,36 +156,6 @@ class FrameStack {
   size_t depth_ = 0;
 };
 
-// Profiler dictionaries repeat a few dozen keys once per item ("_name",
-// "version", ...): each is stored once. The table stops taking keys at a
-// fixed size, so a document of distinct keys costs one copy of each, as
-// without the table, and no more.
-class KeyTable {
- public:
-  std::string_view intern(std::string_view key, Arena& arena) {
-    if (slots_.empty()) slots_.resize(kSlots);
-    for (size_t i = std::hash<std::string_view>()(key) & (kSlots - 1);;
-         i = (i + 1) & (kSlots - 1)) {
-      std::string_view& slot = slots_[i];
-      if (!slot.data()) {
-        std::string_view copy = arena.copyText(key);
-        if (used_ < kSlots / 2) {
-          slot = copy;
-          ++used_;
-        }
-        return copy;
-      }
-      if (slot == key) return slot;
-    }
-  }
-
- private:
-  static constexpr size_t kSlots = 4096;
-  // Empty slots have no data (a stored key always has, even when empty).
-  std::vector<std::string_view> slots_;
-  size_t used_ = 0;
-};
-
 class Reader {
  public:
   bool read(std::string_view document, Plist* out, std::string* warning);
@@ -211,7 +181,8 @@ class Reader {
   XML_Parser parser_ = nullptr;
   Arena arena_;
   FrameStack stack_;
-  KeyTable keys_;
+  // Profiler dictionaries repeat a few dozen keys once per item.
+  SharedTexts keys_;
   // The leaf element being read, if any; leaves never nest.
   bool in_leaf_ = false;
   Element leaf_ = Element::kUnknown;
@@ -342,7 +313,7 @@ void Reader::finishLeaf() {
       note("unreadable key");
       return;
     }
-    frame.key = keys_.intern(text_, arena_);
+    frame.key = keys_.share(text_, arena_);
     return;
   }
   PlistValue value;

@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
+#include <functional>
 
 namespace cvn {
 namespace {
@@ -97,6 +98,34 @@ std::string_view Arena::copyText(std::string_view text) {
   if (!text.empty()) std::memcpy(copy, text.data(), text.size());
   copy[text.size()] = '\0';
   return std::string_view(copy, text.size());
+}
+
+std::string_view Arena::copyCountedText(std::string_view text) {
+  if (text.size() > UINT32_MAX - 1) text = text.substr(0, UINT32_MAX - 1);
+  const uint32_t size = static_cast<uint32_t>(text.size());
+  char* bytes = static_cast<char*>(allocate(sizeof size + size + 1, alignof(uint32_t)));
+  std::memcpy(bytes, &size, sizeof size);
+  if (size) std::memcpy(bytes + sizeof size, text.data(), size);
+  bytes[sizeof size + size] = '\0';
+  return std::string_view(bytes + sizeof size, size);
+}
+
+std::string_view SharedTexts::share(std::string_view text, Arena& arena) {
+  if (text.size() > kLongestShared) return arena.copyCountedText(text);
+  if (!slots_) slots_ = std::make_unique<std::string_view[]>(kSlots);
+  for (size_t i = std::hash<std::string_view>()(text) & (kSlots - 1);; i = (i + 1) & (kSlots - 1)) {
+    std::string_view& slot = slots_[i];
+    if (!slot.data()) {
+      std::string_view copy = arena.copyCountedText(text);
+      // Kept at most half full, so a probe ends soon at an empty slot.
+      if (used_ < kSlots / 2) {
+        slot = copy;
+        ++used_;
+      }
+      return copy;
+    }
+    if (slot == text) return slot;
+  }
 }
 
 void Arena::adopt(Arena&& other) {

@@ -10,6 +10,8 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
+#include <memory>
 #include <new>
 #include <string_view>
 #include <type_traits>
@@ -48,6 +50,11 @@ class Arena {
   /// A copy of `text` with a NUL byte after it, so that the copy can also be
   /// handed to C functions.
   std::string_view copyText(std::string_view text);
+
+  /// The same, with the length in the four bytes before the copy, so that
+  /// countedText() can find the whole text from its first byte. Cut at
+  /// 4 GiB - 2 bytes.
+  std::string_view copyCountedText(std::string_view text);
 
   /// Keeps what `other` holds alive for as long as this arena; `other` is
   /// left empty. Lets values move between trees without copying.
@@ -94,6 +101,31 @@ class ArenaRange {
  protected:
   T* data_ = nullptr;
   Size size_ = 0;
+};
+
+/// The text copyCountedText() made, from its first byte.
+inline std::string_view countedText(const char* bytes) {
+  uint32_t size;
+  std::memcpy(&size, bytes - sizeof size, sizeof size);
+  return std::string_view(bytes, size);
+}
+
+/// One counted copy of each short text that a document or tree repeats: the
+/// keys and names the profiler writes once per item ("_name", "version",
+/// ...), and the names and notes the sections write once per record. The
+/// first texts seen are remembered, up to a fixed number, so a document of
+/// distinct texts costs one copy of each, as without sharing, and no more.
+class SharedTexts {
+ public:
+  /// A copy of `text` made by copyCountedText(), or an earlier equal one.
+  std::string_view share(std::string_view text, Arena& arena);
+
+ private:
+  static constexpr size_t kSlots = 4096;
+  static constexpr size_t kLongestShared = 64;
+  // Empty slots have no data (a stored text always has, even when empty).
+  std::unique_ptr<std::string_view[]> slots_;
+  size_t used_ = 0;
 };
 
 inline void* Arena::allocate(size_t size, size_t alignment) {

@@ -16,45 +16,24 @@ namespace cvn {
 // ---------------------------------------------------------------- TagStore
 
 // What every tag of one tree shares: the arena that holds them, and one copy
-// of each short name that the tree repeats. A raw tree of many applications
-// names the same seven keys in every item; remembering the last text seen in
-// each of a few hundred slots keeps one copy of each instead of one per item.
+// of each short property name and note that the tree repeats (a raw tree of
+// many applications names the same seven keys in every item).
 class TagStore {
  public:
   Arena& arena() { return arena_; }
 
-  /// A copy of `text`, shared with an earlier equal one when it is short.
-  std::string_view text(std::string_view text) { return name(text).view(); }
-
-  TagName name(std::string_view text) {
-    if (text.size() > kLongestShared) return copy(text);
-    size_t slot = std::hash<std::string_view>()(text) & (kSlots - 1);
-    TagName& shared = names_[slot];
-    if (shared_[slot] && shared.view() == text) return shared;
-    shared = copy(text);
-    shared_[slot] = true;
-    return shared;
-  }
+  /// A counted copy of a tag's name; tag names rarely repeat.
+  TagName name(std::string_view text) { return TagName(arena_.copyCountedText(text)); }
+  /// A counted copy of a property's name, shared with earlier equal ones.
+  TagName sharedName(std::string_view text) { return TagName(shared_.share(text, arena_)); }
+  /// An annotation's key or text, shared with earlier equal ones.
+  std::string_view text(std::string_view text) { return shared_.share(text, arena_); }
 
   TagList<Annotation>* newAnnotationList() { return arena_.make<TagList<Annotation>>(); }
 
  private:
-  static constexpr size_t kLongestShared = 40;
-  static constexpr size_t kSlots = 512;
-
-  TagName copy(std::string_view text) {
-    if (text.size() > UINT32_MAX - 1) text = text.substr(0, UINT32_MAX - 1);
-    const uint32_t size = static_cast<uint32_t>(text.size());
-    char* bytes = static_cast<char*>(arena_.allocate(sizeof size + size + 1, alignof(uint32_t)));
-    std::memcpy(bytes, &size, sizeof size);
-    if (size) std::memcpy(bytes + sizeof size, text.data(), size);
-    bytes[sizeof size + size] = '\0';
-    return TagName(bytes + sizeof size);
-  }
-
   Arena arena_;
-  TagName names_[kSlots];
-  bool shared_[kSlots] = {};
+  SharedTexts shared_;
 };
 
 namespace {
@@ -296,7 +275,7 @@ bool TagValue::operator==(const TagValue& o) const {
 // ------------------------------------------------------------- TagProperty
 
 TagProperty::TagProperty(TagStore& store, std::string_view name)
-    : store_(&store), name_(store.name(name)) {}
+    : store_(&store), name_(store.sharedName(name)) {}
 
 const TagList<Annotation>& TagProperty::annotations() const {
   return annotations_ ? *annotations_ : kNoAnnotations;

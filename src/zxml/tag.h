@@ -7,7 +7,6 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <cstring>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -132,18 +131,14 @@ class TagList : public ArenaRange<T, uint32_t> {
   uint32_t capacity_ = 0;
 };
 
-/// A name kept by a tree: a pointer to its bytes, with the length in the
-/// four bytes before them, so that the millions of names of a large tree
-/// take one word each.
+/// A name kept by a tree: a pointer to a counted copy (Arena::
+/// copyCountedText), so that the millions of names of a large tree take one
+/// word each.
 class TagName {
  public:
   TagName() = default;
-  explicit TagName(const char* counted) : bytes_(counted) {}
-  std::string_view view() const {
-    uint32_t size;
-    std::memcpy(&size, bytes_ - sizeof size, sizeof size);
-    return std::string_view(bytes_, size);
-  }
+  explicit TagName(std::string_view counted) : bytes_(counted.data()) {}
+  std::string_view view() const { return countedText(bytes_); }
 
  private:
   const char* bytes_ = nullptr;
