@@ -5,8 +5,10 @@
 #include <gtest/gtest.h>
 
 #include <cstdio>
+#include <cstdlib>
 #include <string>
 
+#include "corpus_files.h"
 #include "fake_command_runner.h"
 
 namespace cvn {
@@ -34,18 +36,9 @@ std::string output(const std::string& type) {
   return std::string(kProfilerHeader) + body(type) + std::string(kProfilerFooter);
 }
 
-// Counts calls and answers nothing for the first few.
-class SlowRunner : public FakeCommandRunner {
- public:
-  int silent_calls = 3;
-  std::string run(const std::string& cmd, size_t chunk) override {
-    std::string out = FakeCommandRunner::run(cmd, chunk);
-    return silent_calls-- > 0 ? std::string() : out;
-  }
-};
-
 TEST(ProfilerCollectorTest, SplicesEveryTypeInOrderWithOneHeaderAndFooter) {
   FakeCommandRunner runner;
+  runner.setLimits(ToolLimits::forProfilerSeconds(90));
   std::string expected(kProfilerHeader);
   for (const char* type : kTypes) {
     runner.answer(command(type), output(type));
@@ -57,10 +50,16 @@ TEST(ProfilerCollectorTest, SplicesEveryTypeInOrderWithOneHeaderAndFooter) {
   EXPECT_EQ(document, expected);
   EXPECT_EQ(std::ftell(out), 0) << "nothing is printed without the progress flag";
   std::fclose(out);
+  // The slowest types start first.
   ASSERT_EQ(runner.commands_ran_.size(), 21u);
+  EXPECT_EQ(runner.commands_ran_[0], command("SPApplicationsDataType"));
+  EXPECT_EQ(runner.commands_ran_[1], command("SPAirPortDataType"));
+  EXPECT_EQ(runner.commands_ran_[2], command("SPDiscBurningDataType"));
+  EXPECT_EQ(runner.commands_ran_[3], command("SPHardwareDataType"));
+  EXPECT_EQ(runner.most_at_once_, 6u);
   for (size_t i = 0; i < 21; ++i) {
-    EXPECT_EQ(runner.commands_ran_[i], command(kTypes[i]));
     EXPECT_EQ(runner.chunk_sizes_[i], 65536u);
+    EXPECT_EQ(runner.limits_given_[i], std::chrono::seconds(90));
   }
 }
 
@@ -80,18 +79,97 @@ TEST(ProfilerCollectorTest, ShortOutputsDropOutButHeaderAndFooterStay) {
 }
 
 TEST(ProfilerCollectorTest, TrimModesCutByByteCount) {
-  FakeCommandRunner runner;
-  runner.answer(command("A"), output("A"));
-  ProfilerCollector collector(runner);
-  EXPECT_EQ(collector.runProfiler("A", ProfilerCollector::Trim::kFirst),
+  using Trim = ProfilerCollector::Trim;
+  EXPECT_EQ(trimProfilerOutput(output("A"), Trim::kFirst),
             std::string(kProfilerHeader) + body("A"));
-  EXPECT_EQ(collector.runProfiler("A", ProfilerCollector::Trim::kMiddle), body("A"));
-  EXPECT_EQ(collector.runProfiler("A", ProfilerCollector::Trim::kLast),
-            body("A") + std::string(kProfilerFooter));
-  runner.answer(command("B"), std::string(190, 'x'));
-  EXPECT_EQ(collector.runProfiler("B", ProfilerCollector::Trim::kMiddle), "");
-  runner.answer(command("B"), std::string(191, 'x'));
-  EXPECT_EQ(collector.runProfiler("B", ProfilerCollector::Trim::kMiddle), "x");
+  EXPECT_EQ(trimProfilerOutput(output("A"), Trim::kMiddle), body("A"));
+  EXPECT_EQ(trimProfilerOutput(output("A"), Trim::kLast), body("A") + std::string(kProfilerFooter));
+  EXPECT_EQ(trimProfilerOutput(std::string(190, 'x'), Trim::kMiddle), "");
+  EXPECT_EQ(trimProfilerOutput(std::string(191, 'x'), Trim::kMiddle), "x");
+}
+
+// Everything one collection gives, to compare two ways of running it.
+struct Collected {
+  std::string document;
+  std::vector<size_t> part_ends;
+  std::vector<std::string> extra_documents;
+  std::string progress;
+};
+
+Collected collectWith(FakeCommandRunner& runner, size_t side_by_side) {
+  Collected c;
+  char* text = nullptr;
+  size_t size = 0;
+  std::FILE* out = open_memstream(&text, &size);
+  c.document =
+      ProfilerCollector(runner, side_by_side).collect(true, out, &c.part_ends, &c.extra_documents);
+  std::fclose(out);
+  c.progress.assign(text, size);
+  std::free(text);
+  return c;
+}
+
+TEST(ProfilerCollectorTest, SideBySideGivesWhatOneAtATimeGivesForBothSampleMacs) {
+  for (const char* mac : {"sample_mac", "modern_mac"}) {
+    auto prepare = [&](FakeCommandRunner& runner) {
+      for (const char* type : kTypes) {
+        std::string path =
+            std::string(CVN_SOURCE_DIR "/tests/") + mac + "/profiler/" + type + ".xml";
+        runner.answer(command(type), readWholeFile(path));
+      }
+      for (const char* type : {"SPNVMeDataType", "SPStorageDataType", "SPUSBHostDataType"}) {
+        std::string path =
+            std::string(CVN_SOURCE_DIR "/tests/") + mac + "/profiler/" + type + ".xml";
+        runner.answer(command(type), readWholeFile(path));
+      }
+      // Prints nothing twice before it answers: asked again at once each time.
+      runner.answerInTurn(command("SPBluetoothDataType"), {ToolOutput{}, ToolOutput{}});
+    };
+    FakeCommandRunner one_at_a_time;
+    prepare(one_at_a_time);
+    FakeCommandRunner side_by_side;
+    prepare(side_by_side);
+    side_by_side.last_started_ends_first = true;
+
+    Collected expected = collectWith(one_at_a_time, 1);
+    Collected got = collectWith(side_by_side, 6);
+    EXPECT_EQ(one_at_a_time.most_at_once_, 1u);
+    EXPECT_EQ(side_by_side.most_at_once_, 6u);
+    EXPECT_EQ(side_by_side.commands_ran_.size(), 26u) << mac;
+    EXPECT_GT(expected.document.size(), 10000u) << mac;
+    EXPECT_EQ(got.document, expected.document) << mac;
+    EXPECT_EQ(got.part_ends, expected.part_ends) << mac;
+    EXPECT_EQ(got.extra_documents, expected.extra_documents) << mac;
+    EXPECT_EQ(got.progress, "10%\n20%\n30%\n40%\n50%\n60%\n70%\n80%\n90%\n100%\n") << mac;
+    EXPECT_EQ(got.progress, expected.progress) << mac;
+  }
+}
+
+TEST(ProfilerCollectorTest, ARunThatHitItsLimitIsLeftOutNamedAndNeverAskedAgain) {
+  FakeCommandRunner runner;
+  runner.setLimits(ToolLimits::forProfilerSeconds(300));
+  for (const char* type : kTypes) runner.answer(command(type), output(type));
+  runner.answer(command("SPNVMeDataType"), output("SPNVMeDataType"));
+  for (const char* type :
+       {"SPHardwareDataType", "SPBluetoothDataType", "SPPowerDataType", "SPStorageDataType"})
+    runner.hang(command(type), output(type));
+  Collected c = collectWith(runner, 6);
+  std::string expected(kProfilerHeader);
+  for (const char* type : kTypes) {
+    if (std::string(type) != "SPHardwareDataType" && std::string(type) != "SPBluetoothDataType" &&
+        std::string(type) != "SPPowerDataType")
+      expected += body(type);
+  }
+  expected += kProfilerFooter;
+  EXPECT_EQ(c.document, expected);
+  EXPECT_EQ(c.extra_documents, std::vector<std::string>{output("SPNVMeDataType")})
+      << "SPStorageDataType hung, and SPUSBHostDataType printed nothing: asked once each";
+  EXPECT_EQ(c.progress,
+            "SPHardwareDataType: no answer in 300 s, left out\n10%\n20%\n"
+            "SPBluetoothDataType: no answer in 300 s, left out\n30%\n40%\n50%\n60%\n70%\n"
+            "80%\n90%\nSPPowerDataType: no answer in 300 s, left out\n100%\n"
+            "SPStorageDataType: no answer in 300 s, left out\n");
+  EXPECT_EQ(runner.commands_ran_.size(), 24u);
 }
 
 }  // namespace
@@ -145,20 +223,6 @@ TEST(CollectedDocumentTest, AWellFormedDocumentIsReadWhole) {
   ASSERT_TRUE(parseCollectedDocument(document, {10, document.size()}, &root));
   EXPECT_EQ(dataTypes(root), (std::vector<std::string>{"A", "B"}));
   EXPECT_FALSE(parseCollectedDocument("no xml here", {5, 11}, &root));
-}
-
-TEST(ExtraTypesTest, EachIsAskedOnceAndOnlyWhatPrintedSomethingIsKept) {
-  FakeCommandRunner runner;
-  std::string nvme =
-      std::string(kProfilerHeader) + typeDict("SPNVMeDataType") + std::string(kProfilerFooter);
-  runner.answer(command("SPNVMeDataType"), nvme);
-  // SPStorageDataType prints nothing, as on a profiler that does not know it.
-  runner.answer(command("SPUSBHostDataType"), "<plist");
-  std::vector<std::string> documents = ProfilerCollector(runner).collectExtraTypes();
-  EXPECT_EQ(documents, (std::vector<std::string>{nvme, "<plist"}));
-  EXPECT_EQ(runner.commands_ran_,
-            (std::vector<std::string>{command("SPNVMeDataType"), command("SPStorageDataType"),
-                                      command("SPUSBHostDataType")}));
 }
 
 TEST(ExtraTypesTest, OnlyTheAskedTypesJoinTheListAndEachOnce) {

@@ -22,13 +22,12 @@ const std::string kProfiler = "system_profiler -detailLevel full -xml";
 // Answers the profiler from the sample Mac's recordings, the rest from the table.
 class SampleMacRunner : public FakeCommandRunner {
  public:
-  std::string run(const std::string& command, size_t chunk_size) override {
+  ToolOutput respond(const std::string& command) override {
     if (command.compare(0, kProfiler.size(), kProfiler) != 0)
-      return FakeCommandRunner::run(command, chunk_size);
-    commands_ran_.push_back(command);
+      return FakeCommandRunner::respond(command);
     std::string type = command.size() > kProfiler.size() ? command.substr(kProfiler.size() + 1)
                                                          : std::string("full");
-    return readWholeFile(CVN_SOURCE_DIR "/tests/sample_mac/profiler/" + type + ".xml");
+    return {readWholeFile(CVN_SOURCE_DIR "/tests/sample_mac/profiler/" + type + ".xml"), false};
   }
 };
 

@@ -7,7 +7,8 @@
 #include <string>
 #include <vector>
 
-#include "collect/command_runner.h"
+#include "collect/process_group_runner.h"
+#include "collect/shell_quote.h"
 #include "fake_command_runner.h"
 #include "sections/sections.h"
 #include "tree_text.h"
@@ -50,11 +51,14 @@ is-system-user="0"
 
 // Hands out a canned listing and runs dscl commands through the real shell,
 // with a stand-in dscl from `dir`.
-class ListingThenShellRunner : public PipeCommandRunner {
+class ListingThenShellRunner : public ProcessGroupRunner {
  public:
-  std::string run(const std::string& command, size_t chunk_size) override {
-    if (command == "ls -1 /Users/") return listing;
-    return PipeCommandRunner::run(dir + "/" + command, chunk_size);
+  void start(int id, const std::string& command, size_t chunk_size, ToolDuration limit) override {
+    if (command == "ls -1 /Users/") {
+      ProcessGroupRunner::start(id, "printf '%s' " + shellQuote(listing), chunk_size, limit);
+    } else {
+      ProcessGroupRunner::start(id, dir + "/" + command, chunk_size, limit);
+    }
   }
   std::string listing;
   std::string dir;

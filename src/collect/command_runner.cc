@@ -1,69 +1,54 @@
 #include "collect/command_runner.h"
 
-#include <cstdio>
-#include <vector>
+#include <algorithm>
+
+#include "collect/process_group_runner.h"
 
 namespace cvn {
+namespace {
 
-std::string PipeCommandRunner::run(const std::string& command, size_t chunk_size) {
-  std::string output;
-  if (chunk_size == 0) chunk_size = 1;
-  FILE* pipe = ::popen(command.c_str(), "r");
-  if (!pipe) return output;
-  std::vector<char> chunk(chunk_size);
-  size_t got = 0;
-  // A tool that has not written yet when we first look gets three chances.
-  for (int attempt = 0; attempt < 3; ++attempt) {
-    got = std::fread(chunk.data(), 1, chunk_size, pipe);
-    if (got > 0 || std::feof(pipe) || std::ferror(pipe)) break;
-    std::clearerr(pipe);
+// Collected text (a folder name) can sit in a command; a log line must not
+// carry its control characters to the operator's terminal.
+std::string printable(const std::string& text) {
+  std::string out = text;
+  for (char& c : out) {
+    if (static_cast<unsigned char>(c) < 0x20 || c == 0x7f) c = '?';
   }
-  output.append(chunk.data(), got);
-  while (got == chunk_size && !std::feof(pipe) && !std::ferror(pipe)) {
-    got = std::fread(chunk.data(), 1, chunk_size, pipe);
-    output.append(chunk.data(), got);
+  return out;
+}
+
+}  // namespace
+
+ToolLimits ToolLimits::forProfilerSeconds(int64_t seconds) {
+  ToolLimits limits;
+  limits.profiler = std::chrono::seconds(seconds);
+  limits.other = std::min(limits.other, limits.profiler);
+  return limits;
+}
+
+ToolOutput CommandRunner::runBounded(const std::string& command, size_t chunk_size) {
+  constexpr int kOnlyRun = 0;
+  start(kOnlyRun, command, chunk_size, limits_.other);
+  int id = kOnlyRun;
+  ToolOutput output;
+  if (!waitForOne(&id, &output)) return ToolOutput{};
+  if (output.timed_out && timeout_log_) {
+    std::fprintf(timeout_log_, "%s: no answer in %s, kept what it printed\n",
+                 printable(command).c_str(), describeLimit(limits_.other).c_str());
+    std::fflush(timeout_log_);
   }
-  ::pclose(pipe);
   return output;
 }
 
+std::string describeLimit(ToolDuration limit) {
+  long long ms = static_cast<long long>(limit.count());
+  if (ms % 1000 == 0) return std::to_string(ms / 1000) + " s";
+  return std::to_string(ms) + " ms";
+}
+
 CommandRunner& systemCommandRunner() {
-  static PipeCommandRunner runner;
+  static ProcessGroupRunner runner;
   return runner;
-}
-
-std::string escapeForDoubleQuotes(std::string_view text) {
-  std::string out;
-  out.reserve(text.size());
-  for (char c : text) {
-    if (c == '$' || c == '`' || c == '"' || c == '\\') out += '\\';
-    out += c;
-  }
-  return out;
-}
-
-std::string shellQuote(std::string_view text) {
-  bool safe = !text.empty();
-  for (char c : text) {
-    bool ok = (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || (c >= '0' && c <= '9');
-    for (char s : std::string_view("_./:@%+,=-"))
-      if (c == s) ok = true;
-    if (!ok) {
-      safe = false;
-      break;
-    }
-  }
-  if (safe) return std::string(text);
-  std::string out = "'";
-  for (char c : text) {
-    if (c == '\'') {
-      out += "'\\''";
-    } else {
-      out += c;
-    }
-  }
-  out += '\'';
-  return out;
 }
 
 }  // namespace cvn

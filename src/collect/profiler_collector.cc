@@ -1,5 +1,8 @@
 #include "collect/profiler_collector.h"
 
+#include <algorithm>
+#include <optional>
+
 #include "collect/plist.h"
 
 namespace cvn {
@@ -40,6 +43,15 @@ constexpr Step kSteps[] = {
 // Types the older Macs do not have; a Mac without them scans as before.
 constexpr const char* kExtraTypes[] = {"SPNVMeDataType", "SPStorageDataType", "SPUSBHostDataType"};
 
+constexpr size_t kStepCount = sizeof kSteps / sizeof kSteps[0];
+constexpr size_t kExtraCount = sizeof kExtraTypes / sizeof kExtraTypes[0];
+
+// The slowest types on real Macs start first, so that a scan lasts little
+// longer than the slowest of them alone.
+constexpr std::string_view kSlowFirst[] = {"SPApplicationsDataType", "SPAirPortDataType",
+                                           "SPDiscBurningDataType", "SPNVMeDataType",
+                                           "SPStorageDataType"};
+
 constexpr std::string_view kCommand = "system_profiler -detailLevel full -xml ";
 
 bool isExtraType(std::string_view data_type) {
@@ -62,31 +74,22 @@ bool holdsDataType(const PlistValue& root, std::string_view data_type) {
 
 }  // namespace
 
-std::string ProfilerCollector::runProfiler(std::string_view data_type, Trim trim) {
-  std::string command(kCommand);
-  command += data_type;
-  std::string output;
-  // Deliberately unbounded: every data type is waited for rather than left
-  // out of the inventory.
-  do {
-    output = runner_.run(command, kProfilerChunk);
-  } while (output.empty());
-
+std::string trimProfilerOutput(std::string output, ProfilerCollector::Trim trim) {
   const size_t head = kProfilerHeader.size();
   const size_t foot = kProfilerFooter.size();
+  // Trimmed in place: the applications' output can be most of the document,
+  // and a trimmed copy would hold it twice.
   switch (trim) {
-    case Trim::kFirst:
+    case ProfilerCollector::Trim::kFirst:
       if (output.size() < foot + 1) return std::string();
       output.resize(output.size() - foot);
       return output;
-    // Trimmed in place: the applications' output can be most of the
-    // document, and a trimmed copy would hold it twice.
-    case Trim::kMiddle:
+    case ProfilerCollector::Trim::kMiddle:
       if (output.size() < head + foot + 1) return std::string();
       output.resize(output.size() - foot);
       output.erase(0, head);
       return output;
-    case Trim::kLast:
+    case ProfilerCollector::Trim::kLast:
       if (output.size() < head + 1) return std::string();
       output.erase(0, head);
       return output;
@@ -95,45 +98,107 @@ std::string ProfilerCollector::runProfiler(std::string_view data_type, Trim trim
 }
 
 std::string ProfilerCollector::collect(bool progress, std::FILE* out,
-                                       std::vector<size_t>* part_ends) {
+                                       std::vector<size_t>* part_ends,
+                                       std::vector<std::string>* extra_documents) {
+  // Runs are numbered: the steps first, in their order, then the extra types.
+  const size_t run_count = kStepCount + (extra_documents ? kExtraCount : 0);
+  auto dataTypeOfRun = [](size_t run) {
+    return std::string_view(run < kStepCount ? kSteps[run].data_type
+                                             : kExtraTypes[run - kStepCount]);
+  };
+  std::vector<size_t> start_order;
+  for (std::string_view slow : kSlowFirst) {
+    for (size_t run = 0; run < run_count; ++run) {
+      if (dataTypeOfRun(run) == slow) start_order.push_back(run);
+    }
+  }
+  for (size_t run = 0; run < run_count; ++run) {
+    if (std::find(start_order.begin(), start_order.end(), run) == start_order.end())
+      start_order.push_back(run);
+  }
+
+  const ToolDuration limit = runner_.limits().profiler;
+  auto startRun = [&](size_t run) {
+    runner_.start(static_cast<int>(run), std::string(kCommand) + std::string(dataTypeOfRun(run)),
+                  kProfilerChunk, limit);
+  };
+  auto noteTimeout = [&](size_t run, const char* outcome) {
+    if (!progress) return;
+    std::fprintf(out, "%.*s: no answer in %s, %s\n", static_cast<int>(dataTypeOfRun(run).size()),
+                 dataTypeOfRun(run).data(), describeLimit(limit).c_str(), outcome);
+  };
+
+  std::vector<std::optional<ToolOutput>> results(run_count);
   std::string document;
   if (part_ends) part_ends->clear();
-  constexpr size_t kStepCount = sizeof kSteps / sizeof kSteps[0];
-  for (size_t i = 0; i < kStepCount; ++i) {
-    const Step& step = kSteps[i];
-    Trim trim = i == 0 ? Trim::kFirst : i + 1 == kStepCount ? Trim::kLast : Trim::kMiddle;
-    std::string part = runProfiler(step.data_type, trim);
-    if (!part.empty()) {
-      document += part;
-    } else if (trim == Trim::kFirst) {
-      document += kProfilerHeader;
-    } else if (trim == Trim::kLast) {
-      document += kProfilerFooter;
+  size_t started = 0;
+  size_t running = 0;
+  size_t spliced = 0;
+  while (started < run_count || running > 0) {
+    for (; running < side_by_side_ && started < run_count; ++started, ++running)
+      startRun(start_order[started]);
+    int id = 0;
+    ToolOutput output;
+    if (!runner_.waitForOne(&id, &output)) break;
+    --running;
+    const size_t run = static_cast<size_t>(id);
+    if (run >= run_count) continue;
+    // Deliberately unbounded for a step that ends having printed nothing:
+    // every data type is waited for rather than left out of the inventory.
+    // One that hit its limit is never asked again.
+    if (run < kStepCount && output.text.empty() && !output.timed_out) {
+      startRun(run);
+      ++running;
+      continue;
     }
-    if (part_ends && (!part_ends->empty() ? part_ends->back() : 0) != document.size()) {
-      part_ends->push_back(document.size());
-    }
-    if (progress && step.progress) {
-      std::fputs(step.progress, out);
-      std::fflush(out);
+    results[run] = std::move(output);
+
+    // Spliced in the fixed order, so the document and the progress lines
+    // are what one run at a time would give.
+    for (; spliced < kStepCount && results[spliced]; ++spliced) {
+      ToolOutput& result = *results[spliced];
+      Trim trim = spliced == 0                ? Trim::kFirst
+                  : spliced + 1 == kStepCount ? Trim::kLast
+                                              : Trim::kMiddle;
+      std::string part;
+      if (result.timed_out) {
+        noteTimeout(spliced, "left out");
+      } else {
+        part = trimProfilerOutput(std::move(result.text), trim);
+      }
+      results[spliced].reset();
+      if (!part.empty()) {
+        document += part;
+      } else if (trim == Trim::kFirst) {
+        document += kProfilerHeader;
+      } else if (trim == Trim::kLast) {
+        document += kProfilerFooter;
+      }
+      if (part_ends && (!part_ends->empty() ? part_ends->back() : 0) != document.size()) {
+        part_ends->push_back(document.size());
+      }
+      const char* line = kSteps[spliced].progress;
+      if (spliced + 1 == kStepCount) line = "100%\n";
+      if (progress && line) {
+        std::fputs(line, out);
+        std::fflush(out);
+      }
     }
   }
-  if (progress) {
-    std::fputs("100%\n", out);
-    std::fflush(out);
+
+  if (extra_documents) {
+    extra_documents->clear();
+    for (size_t run = kStepCount; run < run_count; ++run) {
+      if (!results[run]) continue;
+      if (results[run]->timed_out) {
+        noteTimeout(run, "left out");
+      } else if (!results[run]->text.empty()) {
+        extra_documents->push_back(std::move(results[run]->text));
+      }
+    }
+    if (progress) std::fflush(out);
   }
   return document;
-}
-
-std::vector<std::string> ProfilerCollector::collectExtraTypes() {
-  std::vector<std::string> documents;
-  for (const char* data_type : kExtraTypes) {
-    // One run only: unlike the main types, a Mac that lacks these is normal,
-    // and waiting for them would never end.
-    std::string output = runner_.run(std::string(kCommand) + data_type, kProfilerChunk);
-    if (!output.empty()) documents.push_back(std::move(output));
-  }
-  return documents;
 }
 
 void addExtraTypes(const std::vector<std::string>& documents, Plist* root) {

@@ -21,27 +21,30 @@ class ProfilerCollector {
   /// Which ends of one tool output are cut before splicing.
   enum class Trim { kMiddle = 0, kFirst = 1, kLast = 2 };
 
-  explicit ProfilerCollector(CommandRunner& runner) : runner_(runner) {}
+  /// At most `side_by_side` profiler runs at a time.
+  explicit ProfilerCollector(CommandRunner& runner, size_t side_by_side = 6)
+      : runner_(runner), side_by_side_(side_by_side == 0 ? 1 : side_by_side) {}
 
-  /// The spliced document. With `progress` the percentages go to `out`.
-  /// `part_ends`, when given, receives the end offset of every piece
-  /// appended (one per step that added something).
-  std::string collect(bool progress, std::FILE* out, std::vector<size_t>* part_ends = nullptr);
-
-  /// One data type's output, cut by byte count; empty when it is too short
-  /// for the cut. A tool that prints nothing is asked again until it does.
-  std::string runProfiler(std::string_view data_type, Trim trim);
-
-  /// The data types where today's Macs keep their NVMe disks, mounted APFS
-  /// volumes and (from macOS 26) USB tree, each run once after the others
-  /// and kept as a whole document of its own, so that the spliced document
-  /// stays as it was. Prints nothing; a type the profiler does not know
-  /// gives no document.
-  std::vector<std::string> collectExtraTypes();
+  /// The spliced document, the same bytes whatever order the runs end in.
+  /// With `progress` the percentages, and a line for each run that hit its
+  /// limit, go to `out`. `part_ends`, when given, receives the end offset of
+  /// every piece appended (one per step that added something).
+  /// `extra_documents`, when given, receives the whole outputs of the data
+  /// types where today's Macs keep their NVMe disks, mounted APFS volumes
+  /// and (from macOS 26) USB tree, run alongside: each is asked once, since
+  /// a Mac that lacks them is normal, and kept apart, so that the spliced
+  /// document stays what the older Macs give.
+  std::string collect(bool progress, std::FILE* out, std::vector<size_t>* part_ends = nullptr,
+                      std::vector<std::string>* extra_documents = nullptr);
 
  private:
   CommandRunner& runner_;
+  size_t side_by_side_;
 };
+
+/// One data type's output, cut by byte count; empty when it is too short
+/// for the cut.
+std::string trimProfilerOutput(std::string output, ProfilerCollector::Trim trim);
 
 class Plist;
 

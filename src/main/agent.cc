@@ -43,8 +43,10 @@ int runAgent(int argc, char** argv) {
   std::unique_ptr<ProcessTable> processes = makeSystemProcessTable();
   SystemClock clock;
   WorkingDirectory directory;
-  ScanSources sources{systemCommandRunner(), *processes, systemFileSystem(), clock,
-                      readComputerName};
+  CommandRunner& runner = systemCommandRunner();
+  runner.setLimits(ToolLimits::forProfilerSeconds(settings.profiler_timeout_seconds));
+  if (settings.log) runner.setTimeoutLog(stdout);
+  ScanSources sources{runner, *processes, systemFileSystem(), clock, readComputerName};
   ScanDriver driver(ScanTools{sources, directory, stdout, stderr});
   ScanOptions options;
   options.silent = settings.silent;

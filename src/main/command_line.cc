@@ -1,5 +1,6 @@
 #include "main/command_line.h"
 
+#include <cstdint>
 #include <cstring>
 
 namespace cvn {
@@ -7,6 +8,19 @@ namespace {
 
 bool startsWith(const std::string& s, const char* prefix) {
   return s.compare(0, std::strlen(prefix), prefix) == 0;
+}
+
+// Whole seconds, at least one; anything else leaves the default.
+bool parseSeconds(const std::string& text, int64_t* seconds) {
+  if (text.empty() || text.size() > 10) return false;
+  int64_t value = 0;
+  for (char c : text) {
+    if (c < '0' || c > '9') return false;
+    value = value * 10 + (c - '0');
+  }
+  if (value < 1 || value > INT32_MAX) return false;
+  *seconds = value;
+  return true;
 }
 
 }  // namespace
@@ -26,6 +40,8 @@ CommandLineAction parseCommandLine(const std::vector<std::string>& args, ScanSet
       settings->login = arg.substr(arg.find(':') + 1);
     } else if (arg == "/debug" || arg == "-debug") {
       settings->debug = true;
+    } else if (startsWith(arg, "/timeout:") || startsWith(arg, "-timeout:")) {
+      parseSeconds(arg.substr(9), &settings->profiler_timeout_seconds);
     }
   }
   settings->scan_requested = true;

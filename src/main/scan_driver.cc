@@ -36,13 +36,16 @@ void ScanDriver::run(const OutputSettings& output, const ScanOptions& options) {
   request.login = options.login;
   ScanResult result;
   if (options.debug) {
-    // Deliberately unbounded, like the collector: a profiler that never
-    // answers keeps the debug scan waiting.
-    std::string document;
+    // Asked again while it prints nothing, like the collector; one that hit
+    // its limit is not, and what it printed is kept for support to see.
+    CommandRunner& runner = tools_.sources.runner;
+    ToolOutput document;
     do {
-      document = tools_.sources.runner.run("system_profiler -detailLevel full -xml", 65536);
-    } while (document.empty());
-    result = runDebugPipeline(document, request, tools_.sources);
+      runner.start(0, "system_profiler -detailLevel full -xml", 65536, runner.limits().profiler);
+      int id = 0;
+      if (!runner.waitForOne(&id, &document)) break;
+    } while (document.text.empty() && !document.timed_out);
+    result = runDebugPipeline(document.text, request, tools_.sources);
     // The debug scan prints no stage texts.
     saveAndReport(result.image, false, options.silent, result.host, result.mac_address);
     return;
@@ -54,8 +57,8 @@ void ScanDriver::run(const OutputSettings& output, const ScanOptions& options) {
   log(logging, "I. Collecting Data....\n");
   std::vector<size_t> part_ends;
   ProfilerCollector collector(tools_.sources.runner);
-  std::string document = collector.collect(logging, tools_.out, &part_ends);
-  std::vector<std::string> extra_documents = collector.collectExtraTypes();
+  std::vector<std::string> extra_documents;
+  std::string document = collector.collect(logging, tools_.out, &part_ends, &extra_documents);
   log(logging, "done\n");
   result = runScanPipeline(std::move(document), part_ends, request, tools_.sources,
                            std::move(extra_documents));

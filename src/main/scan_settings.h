@@ -16,6 +16,8 @@ struct ScanSettings {
   std::string ip;
   /// "-login:"; handed on to the asset section.
   std::string login;
+  /// "-timeout:"; the profiler's limit, and the others' when shorter.
+  int64_t profiler_timeout_seconds = 300;
   bool scan_requested = false;
 };
 

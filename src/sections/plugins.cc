@@ -7,6 +7,7 @@
 #include "collect/command_runner.h"
 #include "collect/file_system.h"
 #include "collect/plist.h"
+#include "collect/shell_quote.h"
 #include "sections/builder_util.h"
 #include "sections/sections.h"
 

@@ -10,6 +10,7 @@
 #include <string_view>
 
 #include "collect/command_runner.h"
+#include "collect/shell_quote.h"
 #include "sections/builder_util.h"
 #include "sections/sections.h"
 #include "sections/volume_fields.h"

@@ -2,6 +2,7 @@
 #include <string_view>
 
 #include "collect/command_runner.h"
+#include "collect/shell_quote.h"
 #include "sections/builder_util.h"
 #include "sections/sections.h"
 #include "zxml/size_text.h"
@@ -70,10 +71,13 @@ void addAccount(Tag& accounts, const std::string& folder, std::string_view outpu
 }  // namespace
 
 void buildUsersSection(TagTree& snapshot, CommandRunner& runner) {
-  std::string listing;
+  ToolOutput listed;
   // /Users always holds at least Shared, so an empty listing means that the
-  // tool did not answer; ask again.
-  while (listing.empty()) listing = runner.run("ls -1 /Users/", 100);
+  // tool did not answer; ask again, unless it hung.
+  do {
+    listed = runner.runBounded("ls -1 /Users/", 100);
+  } while (listed.text.empty() && !listed.timed_out);
+  const std::string& listing = listed.text;
 
   size_t line_start = 0;
   // Text after the last line break is not a complete line and is not used.
