@@ -1,0 +1,193 @@
+// Tools that never answer, run for real: through the runner with short
+// limits, and through the whole agent with a profiler type that hangs.
+#include <gtest/gtest.h>
+#include <signal.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string>
+#include <thread>
+
+#include "collect/process_group_runner.h"
+#include "qax_reader.h"
+
+extern char** environ;
+
+namespace cvn {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+using std::chrono::milliseconds;
+
+// Processes of the group that are still alive (zombies waiting for their
+// parent are dead); given a moment, since SIGKILL lands asynchronously.
+int liveMembersOf(pid_t group) {
+  int live = 0;
+  for (int attempt = 0; attempt < 100; ++attempt) {
+    live = 0;
+    for (const auto& entry : std::filesystem::directory_iterator("/proc")) {
+      const std::string name = entry.path().filename().string();
+      if (name.find_first_not_of("0123456789") != std::string::npos) continue;
+      std::ifstream in(entry.path() / "stat");
+      std::string stat((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+      size_t close = stat.rfind(')');
+      if (close == std::string::npos) continue;
+      std::istringstream fields(stat.substr(close + 2));
+      char state = 0;
+      long parent = 0, process_group = 0;
+      fields >> state >> parent >> process_group;
+      if (process_group == group && state != 'Z') ++live;
+    }
+    if (live == 0) break;
+    std::this_thread::sleep_for(milliseconds(20));
+  }
+  return live;
+}
+
+TEST(ProcessGroupRunnerTest, EveryCallEndsByItsLimitAndLeavesNothingOfItsGroup) {
+  const milliseconds limit(300), grace(300);
+  const struct {
+    const char* what;
+    const char* command;
+    std::string output;
+    bool timed_out;
+    bool waits_for_grace;
+  } cases[] = {
+      {"never answers", "sleep 30", "", true, false},
+      {"ignores SIGTERM", "trap '' TERM; sleep 30; sleep 30", "", true, true},
+      {"prints a part, then hangs", "printf 'part\\n'; sleep 30", "part\n", true, false},
+      {"prints after its limit", "sleep 1; echo late", "", true, false},
+      {"ends, leaving a helper behind", "sleep 30 >/dev/null & echo done", "done\n", false, false},
+      {"ends at once", "echo fine; exit 3", "fine\n", false, false},
+  };
+  for (const auto& c : cases) {
+    ProcessGroupRunner runner(grace);
+    Clock::time_point started = Clock::now();
+    runner.start(7, c.command, 4, limit);
+    pid_t group = runner.groupOf(7);
+    ASSERT_GT(group, 0) << c.what;
+    int id = 0;
+    ToolOutput output;
+    ASSERT_TRUE(runner.waitForOne(&id, &output)) << c.what;
+    auto took = std::chrono::duration_cast<milliseconds>(Clock::now() - started);
+    EXPECT_EQ(id, 7) << c.what;
+    EXPECT_EQ(output.text, c.output) << c.what;
+    EXPECT_EQ(output.timed_out, c.timed_out) << c.what;
+    EXPECT_LT(took, limit + grace + milliseconds(1500)) << c.what;
+    EXPECT_EQ(took >= limit + grace, c.waits_for_grace) << c.what;
+    EXPECT_EQ(liveMembersOf(group), 0) << c.what;
+    EXPECT_EQ(runner.groupOf(7), -1) << c.what;
+    EXPECT_FALSE(runner.waitForOne(&id, &output)) << "nothing is left to wait for";
+  }
+}
+
+TEST(ProcessGroupRunnerTest, ToolsSideBySideKeepTheirOwnOutputs) {
+  ProcessGroupRunner runner;
+  const std::string interleaved = "for i in 1 2 3; do echo $0$i; sleep 0.05; done";
+  runner.start(1, "sh -c '" + interleaved + "' a", 2, std::chrono::seconds(20));
+  runner.start(2, "sh -c '" + interleaved + "' b", 1, std::chrono::seconds(20));
+  runner.start(3, "exec /nonexistent/tool 2>/dev/null", 64, std::chrono::seconds(20));
+  std::string got[4];
+  int id = 0;
+  ToolOutput output;
+  while (runner.waitForOne(&id, &output)) got[id] = output.text;
+  EXPECT_EQ(got[1], "a1\na2\na3\n");
+  EXPECT_EQ(got[2], "b1\nb2\nb3\n");
+  EXPECT_EQ(got[3], "");
+  EXPECT_EQ(runner.run("printf x", 1), "x") << "the runner serves again once all have ended";
+}
+
+// The whole agent against the sample Mac, with one profiler type that
+// never answers.
+class HungProfilerTest : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    char pattern[] = "/tmp/cvn-hang-XXXXXX";
+    ASSERT_NE(mkdtemp(pattern), nullptr);
+    root_ = pattern;
+    std::filesystem::create_directories(root_ + "/work");
+  }
+  void TearDown() override { std::filesystem::remove_all(root_); }
+
+  /// Starts the agent with `args` in the work folder, `answer` on its
+  /// stdin; its stdout goes to root_/out.
+  pid_t startAgent(const std::string& args, const std::string& answer) {
+    std::ofstream(root_ + "/stdin") << answer;
+    std::string command =
+        "cd '" + root_ +
+        "/work' && PATH='" CVN_SOURCE_DIR "/tests/fake_bin':\"$PATH\" FAKE_STATE_DIR='" + root_ +
+        "' FAKE_PROFILER_HANG=SPBluetoothDataType"
+        " exec '" CVN_BINARY_DIR "/cvnmacagent' " +
+        args + " >'" + root_ + "/out' 2>/dev/null <'" + root_ + "/stdin'";
+    const char* argv[] = {"sh", "-c", command.c_str(), nullptr};
+    pid_t pid = -1;
+    EXPECT_EQ(
+        posix_spawn(&pid, "/bin/sh", nullptr, nullptr, const_cast<char* const*>(argv), environ), 0);
+    return pid;
+  }
+  /// The hung tool's process group, once it has started.
+  pid_t hungGroup() {
+    for (int i = 0; i < 1000; ++i) {
+      std::ifstream in(root_ + "/hung.pgid");
+      pid_t group = 0;
+      if (in >> group && group > 0) return group;
+      std::this_thread::sleep_for(milliseconds(10));
+    }
+    return -1;
+  }
+  std::string out() {
+    std::ifstream in(root_ + "/out");
+    return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+  }
+
+  std::string root_;
+};
+
+TEST_F(HungProfilerTest, TheScanEndsAfterTheLimitWithAFileThatChecksOut) {
+  Clock::time_point started = Clock::now();
+  pid_t agent = startAgent("-log -timeout:2", "y\n");
+  int status = 0;
+  ASSERT_EQ(waitpid(agent, &status, 0), agent);
+  EXPECT_LT(Clock::now() - started, std::chrono::seconds(10));
+  EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
+  std::string said = out();
+  EXPECT_NE(said.find("20%\nSPBluetoothDataType: no answer in 2 s, left out\n30%\n"),
+            std::string::npos)
+      << said;
+  EXPECT_EQ(liveMembersOf(hungGroup()), 0);
+
+  QaxFile file;
+  std::string error;
+  ASSERT_TRUE(readQaxFile(root_ + "/work/JANE-MBP_0026BB5C3A91.qax", &file, &error)) << error;
+  EXPECT_EQ(std::distance(std::filesystem::directory_iterator(root_ + "/work"),
+                          std::filesystem::directory_iterator()),
+            1);
+  std::string check = "'" CVN_BINARY_DIR "/qaxdump' --check '" + root_ +
+                      "/work/JANE-MBP_0026BB5C3A91.qax' >/dev/null 2>&1";
+  EXPECT_EQ(std::system(check.c_str()), 0);
+}
+
+TEST_F(HungProfilerTest, ASignalToTheAgentEndsTheToolsGroupFirst) {
+  for (int signal_number : {SIGTERM, SIGINT, SIGHUP}) {
+    pid_t agent = startAgent("-silent", "");
+    pid_t group = hungGroup();
+    ASSERT_GT(group, 0);
+    ASSERT_EQ(kill(agent, signal_number), 0);
+    int status = 0;
+    ASSERT_EQ(waitpid(agent, &status, 0), agent);
+    EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == signal_number) << signal_number;
+    EXPECT_EQ(liveMembersOf(group), 0) << signal_number;
+    EXPECT_EQ(out(), "") << signal_number;
+    EXPECT_TRUE(std::filesystem::is_empty(root_ + "/work")) << signal_number;
+    std::filesystem::remove(root_ + "/hung.pgid");
+  }
+}
+
+}  // namespace
+}  // namespace cvn
