@@ -1,6 +1,8 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <utility>
+#include <vector>
 
 #include "sections/sections.h"
 #include "tree_text.h"
@@ -44,6 +46,35 @@ inst-date="2013"
 location=
 -
 )");
+}
+
+TEST(ApplicationsSectionTest, ArchKindNamesTheCodeOnlyWhereNo64BitIntelFlagIsGiven) {
+  using Keys = std::vector<std::pair<const char*, const char*>>;
+  // The keys of an item named "A", and its record's lines between the name and "location".
+  const std::pair<Keys, const char*> cases[] = {
+      {{{"arch_kind", "arch_arm"}}, "64bit-app=\"1\"\narch=\"Apple Silicon\"\n"},
+      {{{"arch_kind", "arch_arm_i64"}}, "64bit-app=\"1\"\narch=\"Universal\"\n"},
+      {{{"arch_kind", "arch_i64"}}, "64bit-app=\"1\"\narch=\"Intel\"\n"},
+      {{{"arch_kind", "arch_i32_i64"}}, "64bit-app=\"1\"\narch=\"Intel\"\n"},
+      {{{"arch_kind", "arch_i32"}}, "arch=\"Intel 32-bit\"\n"},
+      {{{"arch_kind", "arch_ppc"}}, "arch=\"PowerPC\"\n"},
+      {{{"arch_kind", "arch_ios"}}, "64bit-app=\"1\"\narch=\"iOS\"\n"},
+      {{{"arch_kind", "arch_web"}}, "64bit-app=\"1\"\n~type=unknown\narch=\"Web\"\n"},
+      {{{"arch_kind", "arch_other"}}, "64bit-app=\"1\"\n~type=unknown\narch=\"Other\"\n"},
+      {{{"arch_kind", "arch_riscv"}}, "64bit-app=\"1\"\n~type=unknown\narch=\"Other\"\n"},
+      // The flag, where the profiler still prints it, says all there is.
+      {{{"has64BitIntelCode", "no"}, {"arch_kind", "arch_arm"}}, ""},
+  };
+  for (const auto& [keys, expected] : cases) {
+    TagTree raw(true, "Macintosh"), snapshot(true, "Snapshot");
+    raw.setValue("/SPApplicationsDataType/_items/item0/_name", "A");
+    for (const auto& [key, value] : keys)
+      raw.setValue(std::string("/SPApplicationsDataType/_items/item0/") + key, value);
+    buildApplicationsSection(snapshot, raw);
+    EXPECT_EQ(treeText(snapshot.top().findChild("Software")),
+              std::string("+Software=\n*Soft:A=\"A\"\n") + expected + "location=\n-\n")
+        << keys.back().second;
+  }
 }
 
 }  // namespace

@@ -69,15 +69,13 @@ TEST(ProcessorsSectionTest, PackageCoreAndCacheRules) {
     EXPECT_EQ(buildProcessors({{"packages", packages}}), "") << packages.textForm();
 }
 
-TEST(ProcessorsSectionTest, AppleSiliconIsOneChipWithItsCoresAndNoClockSpeed) {
+TEST(ProcessorsSectionTest, AppleSiliconIsOneChipWithItsCoresAndNoClockSpeedOrCaches) {
   EXPECT_EQ(buildProcessors({{"chip_type", "Apple M3 Pro"},
                              {"number_processors", "proc 12:6:6"},
                              {"physical_memory", "18 GB"}}),
             R"txt(+Processors=
 *Processor:1="Apple M3 Pro"
 core-count=12
-l2-cache-size=0
-l3-cache-size=0
 -
 )txt");
 }
@@ -86,10 +84,11 @@ TEST(ProcessorsSectionTest, ChipNamesAndCoreTexts) {
   // Values: name, cores, L2 KB, L3 KB.
   const std::pair<Keys, const char*> cases[] = {
       {{{"chip_type", "Apple M5 Max"}, {"number_processors", "proc 18:6:0:12"}},
-       "\"Apple M5 Max\" 18 0 0 "},
+       "\"Apple M5 Max\" 18 "},
       // Apple's virtual machines count their cores as an integer.
-      {{{"chip_type", "Apple M4 Max (Virtual)"}, {"number_processors", 4}},
-       "\"Apple M4 Max (Virtual)\" 4 0 0 "},
+      // A chip that does report a cache gets both sizes, as an Intel Mac does.
+      {{{"chip_type", "Apple M4 Max (Virtual)"}, {"number_processors", 4}, {"l2_cache", "4 MB"}},
+       "\"Apple M4 Max (Virtual)\" 4 4096 0 "},
       {{{"cpu_type", "Intel Core i7"}, {"chip_type", "Apple M1"}}, "\"Intel Core i7\" 1 0 0 "},
       // Only "proc" with three or four whole numbers is a core count.
       {{{"number_processors", "proc 8:4"}}, "\"CPU #1\" 0 0 0 "},

@@ -1,4 +1,5 @@
 #include <string>
+#include <string_view>
 
 #include "sections/builder_util.h"
 #include "sections/sections.h"
@@ -8,6 +9,43 @@ namespace {
 
 // "lastModified" arrives as "yyyyMMddHHmmss.000000+zone"; the day is enough.
 constexpr size_t kDateLength = 8;
+
+enum class SixtyFourBit { kYes, kNo, kUnknown };
+
+// From macOS 11 the profiler no longer says whether an app has 64-bit Intel
+// code; it names the code the bundle carries instead, and that is what tells
+// an administrator which apps need Rosetta or cannot run at all.
+struct ArchKind {
+  std::string_view raw;
+  const char* arch;
+  SixtyFourBit code;
+};
+
+constexpr ArchKind kArchKinds[] = {
+    {"arch_arm", "Apple Silicon", SixtyFourBit::kYes},
+    {"arch_arm_i64", "Universal", SixtyFourBit::kYes},
+    {"arch_i64", "Intel", SixtyFourBit::kYes},
+    {"arch_i32_i64", "Intel", SixtyFourBit::kYes},
+    // Neither 32-bit Intel nor PowerPC code runs on a Mac that reports kinds.
+    {"arch_i32", "Intel 32-bit", SixtyFourBit::kNo},
+    {"arch_ppc", "PowerPC", SixtyFourBit::kNo},
+    {"arch_ios", "iOS", SixtyFourBit::kYes},
+    // A web app, like a bundle whose main program is a script, shows no code.
+    {"arch_web", "Web", SixtyFourBit::kUnknown},
+};
+constexpr ArchKind kOtherArch = {"arch_other", "Other", SixtyFourBit::kUnknown};
+
+const ArchKind& findArchKind(std::string_view raw) {
+  for (const ArchKind& kind : kArchKinds)
+    if (kind.raw == raw) return kind;
+  return kOtherArch;
+}
+
+void write64BitApp(Tag& app, SixtyFourBit code) {
+  if (code == SixtyFourBit::kYes) app.setProperty("64bit-app", TagValue("1"));
+  if (code == SixtyFourBit::kUnknown)
+    app.setProperty("64bit-app", TagValue("1"), "type", "unknown");
+}
 
 void writeApplication(Tag& software, const Tag& item) {
   std::string_view name = rawText(item, "_name");
@@ -27,10 +65,15 @@ void writeApplication(Tag& software, const Tag& item) {
     app.setProperty("inst-date", TagValue(rawText(item, "lastModified").substr(0, kDateLength)));
   copyFieldIfPresent(app, "runtime-environment", item, "runtime_environment");
   copyFieldIfPresent(app, "info", item, "info");
-  if (!hasKey(item, "has64BitIntelCode")) {
-    app.setProperty("64bit-app", TagValue("1"), "type", "unknown");
-  } else if (rawText(item, "has64BitIntelCode") == "yes") {
-    app.setProperty("64bit-app", TagValue("1"));
+  if (hasKey(item, "has64BitIntelCode")) {
+    bool yes = rawText(item, "has64BitIntelCode") == "yes";
+    write64BitApp(app, yes ? SixtyFourBit::kYes : SixtyFourBit::kNo);
+  } else if (hasKey(item, "arch_kind")) {
+    const ArchKind& kind = findArchKind(rawText(item, "arch_kind"));
+    write64BitApp(app, kind.code);
+    app.setProperty("arch", TagValue(kind.arch));
+  } else {
+    write64BitApp(app, SixtyFourBit::kUnknown);
   }
   copyField(app, "location", item, "path");
 }

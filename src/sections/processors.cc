@@ -43,6 +43,13 @@ int64_t cacheSizePerPackage(const Tag& item, const char* whole_key, const char* 
   return 0;
 }
 
+bool hasAnyCacheKey(const Tag& item) {
+  for (const char* key :
+       {"l2_cache", "l2_cache_core", "l2_cache_size", "l3_cache", "l3_cache_core", "l3_cache_size"})
+    if (hasKey(item, key)) return true;
+  return false;
+}
+
 // "2.66 GHz" in MHz. A decimal comma is read like a point, as in size texts.
 // GHz x 1000 can land a hair below the whole number it stands for (2.01 x
 // 1000 is 2009.99...), so a result within a millionth of a whole number is
@@ -77,8 +84,11 @@ void buildProcessorsSection(TagTree& snapshot, const TagTree& raw) {
   bool has_speed = speed && speed->isText();
   int64_t megahertz = has_speed ? speedInMegahertz(speed->text()) : 0;
   const TagValue* cpu_type = rawValue(*item, "cpu_type");
-  // Apple Silicon names its chip instead ("Apple M1 Pro").
-  if (!cpu_type) cpu_type = rawValue(*item, "chip_type");
+  // Apple Silicon names its chip instead ("Apple M1 Pro") and reports no
+  // caches, so a 0 there would be as false as a clock speed of 0.
+  bool apple_silicon = !cpu_type && hasKey(*item, "chip_type");
+  if (apple_silicon) cpu_type = rawValue(*item, "chip_type");
+  bool write_caches = !apple_silicon || hasAnyCacheKey(*item);
 
   for (int64_t p = 1; p <= packages; ++p) {
     Tag& processors = snapshot.top().addChild("Processors");
@@ -86,8 +96,10 @@ void buildProcessorsSection(TagTree& snapshot, const TagTree& raw) {
     Tag& processor = processors.setChildValue(
         name, cpu_type ? *cpu_type : TagValue(formatText("CPU #%lld", static_cast<long long>(p))));
     processor.setProperty("core-count", TagValue(cores));
-    processor.setProperty("l2-cache-size", TagValue(l2));
-    processor.setProperty("l3-cache-size", TagValue(l3));
+    if (write_caches) {
+      processor.setProperty("l2-cache-size", TagValue(l2));
+      processor.setProperty("l3-cache-size", TagValue(l3));
+    }
     if (has_speed) processor.setProperty("current-clock-speed", TagValue(megahertz));
   }
 }

@@ -437,8 +437,20 @@ def applications():
             "16.95", source="identified_developer"),
         app("Firefox", "/Applications/Firefox.app", d(2025, 3, 4, 16, 40, 0), "136.0",
             source="identified_developer", info="Firefox 136.0"),
+        app("Pages", "/Applications/Pages.app", d(2025, 2, 19, 22, 5, 44), "14.3",
+            source="mac_app_store"),
+        # Intel-only: runs under Rosetta on this Mac.
         app("Steam", "/Applications/Steam.app", d(2024, 11, 2, 12, 0, 30), "1.0",
             kind="arch_i64", source="identified_developer"),
+        app("zoom.us", "/Applications/zoom.us.app", d(2025, 3, 6, 10, 21, 8),
+            "6.4.0 (51467)", kind="arch_arm", source="identified_developer"),
+        app("Rosetta 2 Updater", "/System/Library/CoreServices/Rosetta 2 Updater.app",
+            d(2025, 2, 28, 6, 14, 2), "1.0", kind="arch_arm"),
+        # An AppleScript droplet: its main program is a script, so no code kind.
+        app("Droplet with Settable Properties",
+            "/Library/Application Support/Script Editor/Templates/Droplets/"
+            "Droplet with Settable Properties.app",
+            d(2025, 2, 28, 6, 14, 2), "1.0", kind="arch_other", source="unknown"),
     ]
     return data_type("SPApplicationsDataType", "SPSoftwareDataType",
                      "SPApplicationsReporter", "1.0", items,
