@@ -92,7 +92,7 @@ void BM_PostProcess(benchmark::State& state) {
   ConvertedDocument in(static_cast<int>(state.range(0)));
   for (auto _ : state) {
     TagTree snapshot(true, "Snapshot");
-    postProcess(snapshot, in.raw, false, in.fakes.runner, in.fakes.files, nullptr);
+    postProcess(snapshot, in.raw, SectionSources{in.fakes.runner, in.fakes.files, ""}, nullptr);
     benchmark::DoNotOptimize(snapshot);
   }
   setCounters(state, in.doc.size());
@@ -101,7 +101,7 @@ void BM_PostProcess(benchmark::State& state) {
 void BM_SerialiseAndSave(benchmark::State& state) {
   ConvertedDocument in(static_cast<int>(state.range(0)));
   TagTree snapshot(true, "Snapshot");
-  postProcess(snapshot, in.raw, false, in.fakes.runner, in.fakes.files, nullptr);
+  postProcess(snapshot, in.raw, SectionSources{in.fakes.runner, in.fakes.files, ""}, nullptr);
   std::string path = "/tmp/cvn-scan-bench-" + std::to_string(getpid()) + ".qax";
   for (auto _ : state) {
     SnapshotFile file(true);

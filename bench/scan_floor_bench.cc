@@ -104,7 +104,7 @@ void BM_ScanAgainstFloor(benchmark::State& state) {
     plist = Plist();
     double converted = cpuSeconds();
     TagTree snapshot(true, "Snapshot");
-    postProcess(snapshot, *raw, false, fakes.runner, fakes.files, nullptr);
+    postProcess(snapshot, *raw, SectionSources{fakes.runner, fakes.files, ""}, nullptr);
     raw.reset();
     double built = cpuSeconds();
     SnapshotFile file(true);

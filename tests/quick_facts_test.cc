@@ -8,8 +8,6 @@
 #include <utility>
 #include <vector>
 
-#include "fake_command_runner.h"
-
 namespace cvn {
 namespace {
 
@@ -28,8 +26,7 @@ std::string profilerList(const std::vector<std::pair<std::string, std::string>>&
 std::string factsText(const std::string& list) {
   Plist root;
   EXPECT_TRUE(parsePlist(list, &root));
-  FakeCommandRunner runner;  // ioreg prints nothing
-  QuickFacts f = readQuickFacts(root, runner);
+  QuickFacts f = readQuickFacts(root, "");  // ioreg printed nothing
   return "packages=" + f.package_count + "\ncores=" + f.processor_count +
          "\nspeed=" + f.processor_speed + "\nmodel=" + f.processor_model +
          "\nmaker=" + f.processor_maker + "\nmemory=" + f.physical_memory +

@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <map>
@@ -126,6 +127,10 @@ TEST_F(ScanDriverTest, NormalScanWritesTheSnapshotUnderAFreeName) {
   EXPECT_EQ(command->value, "/sbin/launchd");
   const QaxTree& asset = file.blocks[1].tree;
   EXPECT_EQ(asset.findProperty("", "int-name")->value, "Jane's MacBook");
+  EXPECT_EQ(std::count_if(runner_.commands_ran_.begin(), runner_.commands_ran_.end(),
+                          [](const std::string& c) { return c.rfind("ioreg ", 0) == 0; }),
+            1)
+      << "the asset summary and the System section share one reading";
 }
 
 TEST_F(ScanDriverTest, DebugScanStoresTheWholeProfilerOutput) {

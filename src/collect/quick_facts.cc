@@ -16,6 +16,8 @@ namespace {
 const char kPlatformUuidCommand[] =
     "ioreg -rd1 -c IOPlatformExpertDevice | awk '/IOPlatformUUID/ { split($0, line, \"\\\"\"); "
     "printf(\"%s\", line[4]); }'";
+// A UUID is 36 characters.
+constexpr size_t kPlatformUuidChunk = 40;
 
 // A missing data type reads as an item without keys.
 const PlistValue& firstItem(const PlistValue& root, std::string_view data_type) {
@@ -110,7 +112,11 @@ void readDisks(const PlistValue& root, QuickFacts* facts) {
 
 }  // namespace
 
-QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
+std::string readPlatformUuid(CommandRunner& runner) {
+  return runner.run(kPlatformUuidCommand, kPlatformUuidChunk);
+}
+
+QuickFacts readQuickFacts(const PlistValue& root, const std::string& ioreg_uuid) {
   QuickFacts facts;
   const PlistValue& software = firstItem(root, "SPSoftwareDataType");
   facts.local_host_name = software.textAt("local_host_name");
@@ -123,7 +129,7 @@ QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner) {
   facts.os_version = software.textAt("os_version");
 
   const PlistValue& hardware = firstItem(root, "SPHardwareDataType");
-  facts.platform_uuid = runner.run(kPlatformUuidCommand, 40);
+  facts.platform_uuid = ioreg_uuid;
   if (facts.platform_uuid.empty()) facts.platform_uuid = hardware.textAt("platform_UUID");
   const PlistValue* packages = hardware.find("packages");
   if (packages && packages->kind() == PlistValue::Kind::kInteger) {

@@ -44,8 +44,13 @@ struct QuickFacts {
   std::string volume_free;
 };
 
-/// `runner` asks ioreg for the platform UUID first.
-QuickFacts readQuickFacts(const PlistValue& root, CommandRunner& runner);
+/// What ioreg prints as the platform UUID; empty when it prints nothing.
+/// Asked once, while collecting: the asset summary and the System section
+/// both use it.
+std::string readPlatformUuid(CommandRunner& runner);
+
+/// `ioreg_uuid` (from readPlatformUuid) comes before the profiler's UUID.
+QuickFacts readQuickFacts(const PlistValue& root, const std::string& ioreg_uuid);
 
 /// The first hardware item's "serial_number"; empty when missing.
 std::string readSerialNumber(const PlistValue& root);

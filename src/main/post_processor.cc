@@ -6,10 +6,13 @@
 
 namespace cvn {
 
-void postProcess(TagTree& snapshot, const TagTree& raw, bool log, CommandRunner& runner,
-                 FileSystem& files, std::FILE* out) {
+void postProcess(TagTree& snapshot, const TagTree& raw, const SectionSources& sources,
+                 std::FILE* log) {
+  CommandRunner& runner = sources.runner;
+  FileSystem& files = sources.files;
+  std::FILE* out = log;
   const std::function<void()> steps[] = {
-      [&] { buildSystemSection(snapshot, raw, runner); },
+      [&] { buildSystemSection(snapshot, raw, sources.ioreg_uuid); },
       [&] { buildProcessorsSection(snapshot, raw); },
       [&] { buildMemorySection(snapshot, raw); },
       [&] { buildDisplaysSection(snapshot, raw); },

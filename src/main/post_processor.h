@@ -4,6 +4,7 @@
 #define CVN_MAIN_POST_PROCESSOR_H_
 
 #include <cstdio>
+#include <string_view>
 
 #include "zxml/tag.h"
 
@@ -12,12 +13,20 @@ namespace cvn {
 class CommandRunner;
 class FileSystem;
 
+/// What the builders read besides the raw tree.
+struct SectionSources {
+  CommandRunner& runner;
+  FileSystem& files;
+  /// ioreg's platform UUID, read once while collecting.
+  std::string_view ioreg_uuid;
+};
+
 /// Runs the fifteen builders in order. The order matters: later builders
 /// work under nodes that earlier ones made (plug-ins under "Software",
-/// removable disks numbered after the storage section's). With `log`, each
-/// step is framed by "N..." and "done" on `out`, flushed at once.
-void postProcess(TagTree& snapshot, const TagTree& raw, bool log, CommandRunner& runner,
-                 FileSystem& files, std::FILE* out);
+/// removable disks numbered after the storage section's). With a `log`,
+/// each step is framed there by "N..." and "done", flushed at once.
+void postProcess(TagTree& snapshot, const TagTree& raw, const SectionSources& sources,
+                 std::FILE* log);
 
 }  // namespace cvn
 

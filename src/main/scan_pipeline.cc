@@ -68,7 +68,8 @@ ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part
   std::string().swap(document);
   std::vector<std::string>().swap(extra_documents);
 
-  QuickFacts facts = readQuickFacts(plist, sources.runner);
+  const std::string ioreg_uuid = readPlatformUuid(sources.runner);
+  QuickFacts facts = readQuickFacts(plist, ioreg_uuid);
   NetworkIdentity identity;
   readNetworkIdentity(plist, ip, &identity);
   std::string serial = readSerialNumber(plist);
@@ -86,7 +87,8 @@ ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part
 
   result.snapshot = std::make_unique<TagTree>(request.native, "Snapshot");
   TagTree& snapshot = *result.snapshot;
-  postProcess(snapshot, *raw, request.log != nullptr, sources.runner, sources.files, request.log);
+  postProcess(snapshot, *raw, SectionSources{sources.runner, sources.files, ioreg_uuid},
+              request.log);
   int64_t end_time = sources.clock.now();
   raw.reset();
 

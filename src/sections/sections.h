@@ -5,6 +5,8 @@
 #ifndef CVN_SECTIONS_SECTIONS_H_
 #define CVN_SECTIONS_SECTIONS_H_
 
+#include <string_view>
+
 #include "zxml/tag.h"
 
 namespace cvn {
@@ -13,7 +15,8 @@ class CommandRunner;
 class FileSystem;
 
 /// "System": computer system, chassis, memory slots, power management.
-void buildSystemSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner);
+/// `ioreg_uuid` stands in for a missing profiler UUID.
+void buildSystemSection(TagTree& snapshot, const TagTree& raw, std::string_view ioreg_uuid);
 /// "Processors".
 void buildProcessorsSection(TagTree& snapshot, const TagTree& raw);
 /// "Memory".

@@ -3,7 +3,6 @@
 #include <string>
 #include <string_view>
 
-#include "collect/command_runner.h"
 #include "sections/builder_util.h"
 #include "sections/sections.h"
 #include "zxml/size_text.h"
@@ -11,14 +10,11 @@
 namespace cvn {
 namespace {
 
-// Prints only the fourth double-quoted field of the IOPlatformUUID line.
-constexpr char kUuidCommand[] =
-    R"cmd(ioreg -rd1 -c IOPlatformExpertDevice | awk '/IOPlatformUUID/ { split($0, line, "\""); printf("%s", line[4]); }')cmd";
-// Read size for the UUID command and the most of its output that is kept: a
-// UUID is 36 characters, so anything longer is not one.
-constexpr size_t kUuidChunkSize = 40;
+// The most of ioreg's output that is kept: a UUID is 36 characters, so
+// anything longer is not one.
+constexpr size_t kIoregUuidKept = 40;
 
-void addHardware(Tag& top, const TagTree& raw, CommandRunner& runner) {
+void addHardware(Tag& top, const TagTree& raw, std::string_view ioreg_uuid) {
   const Tag* item = findFirstItem(raw, "SPHardwareDataType");
   if (!item) return;
   Tag& system = top.addChild("System");
@@ -31,9 +27,7 @@ void addHardware(Tag& top, const TagTree& raw, CommandRunner& runner) {
   if (const TagValue* uuid = rawValue(*item, "platform_UUID")) {
     computer.setProperty("uuid", *uuid);
   } else {
-    std::string output = runner.run(kUuidCommand, kUuidChunkSize);
-    if (output.size() > kUuidChunkSize) output.resize(kUuidChunkSize);
-    computer.setProperty("uuid", TagValue(std::move(output)));
+    computer.setProperty("uuid", TagValue(ioreg_uuid.substr(0, kIoregUuidKept)));
   }
   Tag& chassis = system.addChild("Chassis");
   chassis.setProperty("manuf", TagValue("Apple Inc."));
@@ -121,9 +115,9 @@ void addPowerProfiles(Tag& top, const TagTree& raw) {
 
 }  // namespace
 
-void buildSystemSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner) {
+void buildSystemSection(TagTree& snapshot, const TagTree& raw, std::string_view ioreg_uuid) {
   Tag& top = snapshot.top();
-  addHardware(top, raw, runner);
+  addHardware(top, raw, ioreg_uuid);
   addMemorySlots(top, raw);
   addPowerProfiles(top, raw);
 }
