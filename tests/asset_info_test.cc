@@ -69,7 +69,7 @@ TEST(AssetInfoTest, WritesIdentityAndControlSummary) {
   id.login = "admin";
   id.manual_ip = true;
 
-  auto tree = buildAssetInfo(1, snapshot, "20131115213000.000000+60", facts, id);
+  auto tree = buildAssetInfo(true, snapshot, "20131115213000.000000+60", facts, id);
   EXPECT_EQ(treeText(&tree->top()), R"x(+AssetInfo=
 hostname="janes-mbp"
 ip-address="192.168.1.20"
@@ -130,7 +130,7 @@ fw-status="5"
 
 TEST(AssetInfoTest, ASnapshotWithoutSectionsStillGivesTheSummary) {
   TagTree snapshot(true, "Snapshot");
-  auto tree = buildAssetInfo(1, snapshot, "d", QuickFacts(), AssetIdentity());
+  auto tree = buildAssetInfo(true, snapshot, "d", QuickFacts(), AssetIdentity());
   const Tag* control = tree->top().findChild("control");
   ASSERT_NE(control, nullptr);
   EXPECT_EQ(control->findProperty("os-name"), nullptr);

@@ -10,6 +10,7 @@
 #include "collect/process_table.h"
 #include "fake_command_runner.h"
 #include "fake_file_system.h"
+#include "main/clock.h"
 #include "main/result_directory.h"
 #include "main/scan_pipeline.h"
 

@@ -76,7 +76,7 @@ class ScanDriverTest : public ::testing::Test {
   void runScan(bool debug, bool silent, bool log) {
     OutputSettings output;
     output.progress_log = log ? 1 : 0;
-    ScanOptions options;
+    ScanSettings options;
     options.debug = debug;
     options.silent = silent;
     ScanSources sources{runner_, fakes_.processes, fakes_.files, fakes_.clock,

@@ -103,10 +103,10 @@ std::string virtualTypeOf(const std::string& machine_model) {
   return "nvtPhysical";
 }
 
-std::unique_ptr<TagTree> buildAssetInfo(uint8_t tree_flag, const TagTree& snapshot,
+std::unique_ptr<TagTree> buildAssetInfo(bool native, const TagTree& snapshot,
                                         const std::string& date, const QuickFacts& facts,
                                         const AssetIdentity& identity) {
-  auto tree = std::make_unique<TagTree>(tree_flag != 0, "AssetInfo");
+  auto tree = std::make_unique<TagTree>(native, "AssetInfo");
   TagTree& t = *tree;
   writeAssetFields(t, identity, identity.netbios_name, facts.user_name,
                    virtualTypeOf(facts.machine_model), "nstSSH", "sstService", date,
@@ -136,10 +136,10 @@ std::unique_ptr<TagTree> buildAssetInfo(uint8_t tree_flag, const TagTree& snapsh
   return tree;
 }
 
-void addDebugAssetInfo(SnapshotFile& file, uint8_t tree_flag, const std::string& host_name,
+void addDebugAssetInfo(SnapshotFile& file, bool native, const std::string& host_name,
                        const std::string& date, const AssetIdentity& identity,
                        const std::string& profiler_output) {
-  TagTree tree(tree_flag != 0, "AssetInfo");
+  TagTree tree(native, "AssetInfo");
   writeAssetFields(tree, identity, host_name, std::string(), "nvtPhysical", "nstNone", "sstNone",
                    date, std::string());
   tree.setValue("/scan-attempt", TagValue("1"));

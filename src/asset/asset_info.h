@@ -33,13 +33,13 @@ std::string virtualTypeOf(const std::string& machine_model);
 
 /// The asset tree of a normal scan. `snapshot` holds the finished sections;
 /// `date` is the scan's long date text.
-std::unique_ptr<TagTree> buildAssetInfo(uint8_t tree_flag, const TagTree& snapshot,
+std::unique_ptr<TagTree> buildAssetInfo(bool native, const TagTree& snapshot,
                                         const std::string& date, const QuickFacts& facts,
                                         const AssetIdentity& identity);
 
 /// The debug scan's asset tree and, beside it, the profiler's whole output as
 /// a raw-data block; both are added to `file`. `date` is the long date text.
-void addDebugAssetInfo(SnapshotFile& file, uint8_t tree_flag, const std::string& host_name,
+void addDebugAssetInfo(SnapshotFile& file, bool native, const std::string& host_name,
                        const std::string& date, const AssetIdentity& identity,
                        const std::string& profiler_output);
 

@@ -8,6 +8,7 @@
 #include "collect/computer_name.h"
 #include "collect/file_system.h"
 #include "collect/process_table.h"
+#include "main/clock.h"
 #include "main/command_line.h"
 #include "main/result_directory.h"
 #include "main/scan_driver.h"
@@ -48,12 +49,7 @@ int runAgent(int argc, char** argv) {
   if (settings.log) runner.setTimeoutLog(stdout);
   ScanSources sources{runner, *processes, systemFileSystem(), clock, readComputerName};
   ScanDriver driver(ScanTools{sources, directory, stdout, stderr});
-  ScanOptions options;
-  options.silent = settings.silent;
-  options.debug = settings.debug;
-  options.ip = settings.ip;
-  options.login = settings.login;
-  driver.run(output, options);
+  driver.run(output, settings);
   std::fflush(stdout);
   return 0;
 }

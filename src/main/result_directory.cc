@@ -8,7 +8,6 @@
 #include <csignal>
 #include <cstdlib>
 #include <cstring>
-#include <ctime>
 #include <memory>
 
 namespace cvn {
@@ -238,7 +237,5 @@ SaveOutcome WorkingDirectory::writeFile(const std::string& full_path,
   syncFolder(folder);
   return SaveOutcome::kSaved;
 }
-
-int64_t SystemClock::now() { return static_cast<int64_t>(std::time(nullptr)); }
 
 }  // namespace cvn

@@ -59,18 +59,6 @@ class WorkingDirectory : public ResultDirectory {
   std::string folder_;
 };
 
-/// The scan's clock, in seconds since 1970.
-class Clock {
- public:
-  virtual ~Clock() = default;
-  virtual int64_t now() = 0;
-};
-
-class SystemClock : public Clock {
- public:
-  int64_t now() override;
-};
-
 }  // namespace cvn
 
 #endif  // CVN_MAIN_RESULT_DIRECTORY_H_

@@ -4,6 +4,7 @@
 
 #include "collect/command_runner.h"
 #include "collect/profiler_collector.h"
+#include "main/clock.h"
 #include "main/result_directory.h"
 #include "main/result_name.h"
 
@@ -27,7 +28,7 @@ void ScanDriver::log(bool enabled, const char* text) {
   std::fflush(tools_.out);
 }
 
-void ScanDriver::run(const OutputSettings& output, const ScanOptions& options) {
+void ScanDriver::run(const OutputSettings& output, const ScanSettings& options) {
   if (output.abort_flag) return;
   const bool logging = output.progress_log != 0;
   ScanRequest request;

@@ -24,20 +24,13 @@ struct ScanTools {
   std::FILE* err = stderr;
 };
 
-/// The command line's choices for one scan.
-struct ScanOptions {
-  bool silent = false;
-  bool debug = false;
-  /// Empty means "find it".
-  std::string ip;
-  std::string login;
-};
-
 class ScanDriver {
  public:
   explicit ScanDriver(ScanTools tools) : tools_(std::move(tools)) {}
 
-  void run(const OutputSettings& output, const ScanOptions& options);
+  /// One scan as the command line asked for it; the output record's flags
+  /// decide the byte order, whether to go on at all, and the stage texts.
+  void run(const OutputSettings& output, const ScanSettings& settings);
 
  private:
   void log(bool enabled, const char* text);

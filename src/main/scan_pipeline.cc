@@ -7,8 +7,8 @@
 #include "collect/process_table.h"
 #include "collect/profiler_collector.h"
 #include "collect/quick_facts.h"
+#include "main/clock.h"
 #include "main/post_processor.h"
-#include "main/result_directory.h"
 #include "zxml/QAXfile.h"
 
 namespace cvn {
@@ -101,8 +101,7 @@ ScanResult runScanPipeline(std::string document, const std::vector<size_t>& part
   logStage(request, "V. Creating AssetInfo Section....");
   AssetIdentity asset = assetIdentityOf(identity, computer_name, ip, request.login);
   asset.serial_number = serial;
-  uint8_t tree_flag = request.native ? 1 : 0;
-  result.asset_info = buildAssetInfo(tree_flag, snapshot, date, facts, asset);
+  result.asset_info = buildAssetInfo(request.native, snapshot, date, facts, asset);
   logStage(request, "done\n");
 
   SnapshotFile file(request.native);
@@ -124,14 +123,13 @@ ScanResult runDebugPipeline(const std::string& document, const ScanRequest& requ
   readNetworkIdentity(plist, ip, &identity);
   plist = Plist();
 
-  uint8_t tree_flag = request.native ? 1 : 0;
   SnapshotFile file(request.native);
   std::string computer_name = sources.computer_name ? sources.computer_name() : std::string();
   result.host = hostOf(identity, computer_name);
   result.mac_address = identity.mac_address;
   AssetIdentity asset = assetIdentityOf(identity, computer_name, ip, request.login);
   std::string date = SnapshotFile::makeTimestamp(true, sources.clock.now());
-  addDebugAssetInfo(file, tree_flag, result.host, date, asset, document);
+  addDebugAssetInfo(file, request.native, result.host, date, asset, document);
   result.image = file.makeImage(kCompressedDirectory);
   return result;
 }
