@@ -15,7 +15,9 @@
 #include <thread>
 
 #include "collect/process_group_runner.h"
+#include "fake_command_runner.h"
 #include "qax_reader.h"
+#include "sections/sections.h"
 
 extern char** environ;
 
@@ -101,6 +103,33 @@ TEST(ProcessGroupRunnerTest, ToolsSideBySideKeepTheirOwnOutputs) {
   EXPECT_EQ(got[2], "b1\nb2\nb3\n");
   EXPECT_EQ(got[3], "");
   EXPECT_EQ(runner.run("printf x", 1), "x") << "the runner serves again once all have ended";
+}
+
+TEST(CommandRunnerTest, AToolThatHitItsLimitIsNamedOnceAndGivesWhatItPrinted) {
+  FakeCommandRunner runner;
+  runner.setLimits(ToolLimits::forProfilerSeconds(20));
+  EXPECT_EQ(runner.limits().profiler, std::chrono::seconds(20));
+  EXPECT_EQ(runner.limits().other, std::chrono::seconds(20));
+  EXPECT_EQ(ToolLimits::forProfilerSeconds(900).other, std::chrono::seconds(60));
+  char* text = nullptr;
+  size_t size = 0;
+  std::FILE* log = open_memstream(&text, &size);
+  runner.setTimeoutLog(log);
+  // An empty listing is asked again, but not one that hung.
+  runner.hang("ls -1 /Users/", "");
+  runner.hang("dscl . -read \"/users/\x1b[2J\"", "RecordName: x\n");
+  TagTree snapshot(true, "Snapshot");
+  buildUsersSection(snapshot, runner);
+  runner.hang("ls -1 /Users/", "\x1b[2J\n");
+  buildUsersSection(snapshot, runner);
+  std::fclose(log);
+  EXPECT_EQ(std::string(text, size),
+            "ls -1 /Users/: no answer in 20 s, kept what it printed\n"
+            "ls -1 /Users/: no answer in 20 s, kept what it printed\n"
+            "dscl . -read \"/users/?[2J\": no answer in 20 s, kept what it printed\n");
+  std::free(text);
+  EXPECT_EQ(runner.commands_ran_.size(), 3u);
+  EXPECT_EQ(runner.limits_given_.back(), std::chrono::seconds(20));
 }
 
 // The whole agent against the sample Mac, with one profiler type that
