@@ -60,5 +60,28 @@ TEST(CommandLineTest, OptionsAreMatchedExactlyInOrder) {
   }
 }
 
+TEST(CommandLineTest, TimeoutTakesWholeSecondsOfAtLeastOne) {
+  const struct {
+    std::vector<std::string> args;
+    int64_t seconds;
+  } cases[] = {
+      {{}, 300},
+      {{"-timeout:45"}, 45},
+      {{"/timeout:1"}, 1},
+      {{"-timeout:2147483647"}, 2147483647},
+      {{"-timeout:20", "-timeout:0"}, 20},
+      {{"-timeout:2147483648"}, 300},
+      {{"-timeout:-5"}, 300},
+      {{"-timeout:5s"}, 300},
+      {{"-timeout:"}, 300},
+      {{"-Timeout:9"}, 300},
+  };
+  for (const auto& c : cases) {
+    ScanSettings s;
+    parseCommandLine(c.args, &s, nullptr);
+    EXPECT_EQ(s.profiler_timeout_seconds, c.seconds) << (c.args.empty() ? "" : c.args.back());
+  }
+}
+
 }  // namespace
 }  // namespace cvn
