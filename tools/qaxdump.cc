@@ -3,7 +3,8 @@
 //   qaxdump --json FILE   the directory and the trees as JSON
 //   qaxdump --check FILE  validates the file and prints "ok"; text that
 //                         reads two ways fails it like damage
-//   qaxdump --diff [--all] [--json] OLD NEW
+//   qaxdump --html FILE   the result as a page a person reads
+//   qaxdump --diff [--all] [--json | --html] OLD NEW
 //                         what changed between two results; exits as
 //                         diff(1) does: 0 same, 1 changed, 2 trouble
 #include <cstdio>
@@ -11,7 +12,9 @@
 #include <string>
 
 #include "qax_diff.h"
+#include "qax_diff_html.h"
 #include "qax_diff_text.h"
+#include "qax_html.h"
 #include "qax_json.h"
 #include "qax_reader.h"
 
@@ -53,12 +56,18 @@ void printDump(const cvn::QaxFile& file) {
 
 int usage() {
   std::fprintf(stderr,
-               "usage: qaxdump [--json | --check] FILE\n"
-               "       qaxdump --diff [--all] [--json] OLD NEW\n");
+               "usage: qaxdump [--json | --check | --html] FILE\n"
+               "       qaxdump --diff [--all] [--json | --html] OLD NEW\n");
   return 2;
 }
 
 void writeOut(const std::string& text) { std::fwrite(text.data(), 1, text.size(), stdout); }
+
+// The name a page shows for a file: without the folders it came from.
+std::string baseName(const char* path) {
+  const char* slash = std::strrchr(path, '/');
+  return slash && slash[1] ? slash + 1 : path;
+}
 
 bool readOrSay(const char* path, cvn::QaxFile* file) {
   std::string error;
@@ -76,8 +85,10 @@ int runDiff(const char* old_path, const char* new_path, const char* format, bool
   if (!diff.same_mac) std::fprintf(stderr, "qaxdump: %s\n", cvn::differentMacText(diff).c_str());
   if (!format) {
     writeOut(cvn::renderDiffText(diff));
-  } else {
+  } else if (!std::strcmp(format, "--json")) {
     writeOut(cvn::renderDiffJson(diff));
+  } else {
+    writeOut(cvn::renderDiffHtml(diff, old_file, baseName(old_path), new_file, baseName(new_path)));
   }
   if (std::fflush(stdout) != 0 || std::ferror(stdout)) {
     std::fprintf(stderr, "qaxdump: cannot write the output\n");
@@ -93,7 +104,8 @@ int main(int argc, char** argv) {
   const char* paths[2] = {nullptr, nullptr};
   bool diff = false, all = false;
   for (int i = 1; i < argc; ++i) {
-    if (!std::strcmp(argv[i], "--json") || !std::strcmp(argv[i], "--check")) {
+    if (!std::strcmp(argv[i], "--json") || !std::strcmp(argv[i], "--check") ||
+        !std::strcmp(argv[i], "--html")) {
       if (mode) return usage();
       mode = argv[i];
     } else if (!std::strcmp(argv[i], "--diff") || !std::strcmp(argv[i], "--all")) {
@@ -121,6 +133,8 @@ int main(int argc, char** argv) {
     printDump(file);
   } else if (!std::strcmp(mode, "--json")) {
     writeOut(cvn::renderQaxJson(file));
+  } else if (!std::strcmp(mode, "--html")) {
+    writeOut(cvn::renderQaxHtml(file, baseName(path)));
   } else {
     // Text that reads two ways is as bad as damage: what an importer sees
     // would depend on how it reads.
