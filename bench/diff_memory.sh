@@ -7,7 +7,8 @@
 #
 #   bash bench/diff_memory.sh [BUILD_DIR] [APPLICATIONS...]
 #
-# The default sizes are 40,000 and 160,000 applications.
+# The default sizes are 40,000 and 160,000 applications. CVN_KEEP_WORK=1
+# keeps the results.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 root=$(pwd)

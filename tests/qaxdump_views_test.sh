@@ -4,6 +4,7 @@
 #   qaxdump_views_test.sh BUILD_DIR SOURCE_DIR diff     the diff and its exit codes
 #   qaxdump_views_test.sh BUILD_DIR SOURCE_DIR browser  the pages in a real browser
 # The browser part skips (77) where chromium-headless-shell is missing.
+# CVN_KEEP_WORK=1 keeps the scans and pages for a look.
 set -uo pipefail
 build=$1 source=$2 part=$3
 qaxdump=$build/qaxdump
