@@ -7,7 +7,7 @@
 # temporary folder; its result is kept in build/sample-result/.
 set -euo pipefail
 cd "$(dirname "$0")/.."
-bash scripts/setup.sh
+bash scripts/setup.sh --no-test-tools
 echo "== building the agent and the inspector"
 cmake -S . -B build -DCMAKE_BUILD_TYPE=Release >/dev/null
 cmake --build build -j"$(nproc 2>/dev/null || echo 2)" --target cvnmacagent qaxdump

@@ -8,6 +8,9 @@ cd "$(dirname "$0")/.."
 packages=(cmake g++ make zlib1g-dev libexpat1-dev libgtest-dev libbenchmark-dev
           clang libclang-rt-14-dev clang-format git procps llvm-14 file groff-base
           strace time)
+# Only the tests look at the inspector's pages in a browser; the main job
+# (scripts/run-sample.sh) passes --no-test-tools and does without it.
+[ "${1:-}" = --no-test-tools ] || packages+=(chromium-headless-shell)
 need=()
 have_pkg() { dpkg-query -W -f='${Status}' "$1" 2>/dev/null | grep -q 'install ok installed'; }
 for pkg in "${packages[@]}"; do

@@ -4,8 +4,6 @@
 
 namespace cvn {
 
-namespace {
-
 // Valid UTF-8 passes through; any other byte is written as the Latin-1
 // character of that code so the output is always valid JSON.
 void appendJsonString(std::string_view s, std::string& out) {
@@ -63,6 +61,8 @@ void appendJsonString(std::string_view s, std::string& out) {
   }
   out += '"';
 }
+
+namespace {
 
 void appendJsonAnnotations(const std::vector<QaxAnnotation>& list, std::string& out) {
   out += '[';
