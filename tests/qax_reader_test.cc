@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "qax_json.h"
 #include "zxml/zXML.h"
 
 namespace cvn {
@@ -123,6 +124,26 @@ TEST(QaxReaderTest, TextThatReadsTwoWaysIsNamed) {
     std::vector<std::string> ambiguities;
     EXPECT_TRUE(parseZxmlText(kHeader + c.first, &tree, nullptr, &error, 0, &ambiguities)) << error;
     EXPECT_EQ(ambiguities, c.second) << c.first;
+  }
+}
+
+// Only well-formed UTF-8 passes into the JSON; every other byte becomes the
+// character of its code, so any strict decoder reads the output.
+TEST(QaxReaderTest, JsonCarriesOnlyWellFormedUtf8) {
+  const std::pair<std::string, std::string> cases[] = {
+      {"caf\xC3\xA9 \xF0\x9F\x98\x80", "caf\xC3\xA9 \xF0\x9F\x98\x80"},
+      {"\xF8\x80\x80", "\\u00f8\\u0080\\u0080"},             // no lead byte past F4
+      {"\xC0\xAF", "\\u00c0\\u00af"},                        // overlong
+      {"\xED\xA0\x80", "\\u00ed\\u00a0\\u0080"},             // surrogate
+      {"\xF4\x90\x80\x80", "\\u00f4\\u0090\\u0080\\u0080"},  // past U+10FFFF
+      {"\xE2\x82", "\\u00e2\\u0082"},                        // cut off
+  };
+  for (const auto& c : cases) {
+    QaxFile file;
+    file.blocks.emplace_back();
+    file.blocks[0].tree.nodes.push_back(QaxNode{"S", false, c.first, {}, {}, {}});
+    std::string json = renderQaxJson(file);
+    EXPECT_NE(json.find("\"value\": \"" + c.second + "\""), std::string::npos) << c.second;
   }
 }
 

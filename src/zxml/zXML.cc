@@ -12,6 +12,7 @@
 #include <string>
 
 #include "zxml/tag.h"
+#include "zxml/utf8_text.h"
 
 namespace cvn {
 
@@ -34,9 +35,7 @@ size_t keptLength(std::string_view text) {
   size_t n = std::min(text.size(), kMaxZxmlText);
   if (const void* nul = std::memchr(text.data(), '\0', n))
     return static_cast<size_t>(static_cast<const char*>(nul) - text.data());
-  if (n == text.size()) return n;
-  for (int back = 0; back < 3 && (static_cast<unsigned char>(text[n]) & 0xC0) == 0x80; ++back) --n;
-  return n;
+  return utf8CutLength(text, n);
 }
 
 inline bool opensMarkup(char c) { return c == '+' || c == '*' || c == '-' || c == '~'; }
