@@ -104,6 +104,11 @@ TEST(ZxmlTest, CollectedTextCannotWriteMarkup) {
       {"Soft:Carol\n plain", kName, "Soft:Carol  plain"},
       {std::string("Soft:a\0b", 8), kName, "Soft:a"},
       {"Soft:+*-~", kName, "Soft:+*-~"},
+      {"+Evil", kName, "_Evil"},
+      {"-", kName, "_"},
+      {"~k\n-", kName, "_k -"},
+      {"*x=1", kName, "_x_1"},
+      {"-1", kValue, "-1"},
       // Cut at the limit, backing off to the start of a split UTF-8 sequence.
       {almost + "ab", kValue, almost + "a"},
       {almost + "\xC3\xA9", kValue, almost},

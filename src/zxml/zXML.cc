@@ -91,6 +91,9 @@ __attribute__((noinline)) size_t writeEscapedText(char* out, std::string_view te
         out[i] = ' ';
     }
   }
+  // A property's name begins its line: led by a mark, it would read as a
+  // tag, an annotation or a close.
+  if (opensMarkup(out[0])) out[0] = '_';
   return size;
 }
 
@@ -109,6 +112,7 @@ inline size_t writeText(char* out, std::string_view text, ZxmlField field) {
   if (size > kShortText) return writeEscapedText(out, text, field);
   const bool name = field == ZxmlField::kName;
   const char* bytes = text.data();
+  if (name && size && opensMarkup(bytes[0])) return writeEscapedText(out, text, field);
   size_t i = 0;
   for (; i + 8 <= size; i += 8) {
     uint64_t word;
