@@ -9,6 +9,8 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <memory>
+#include <new>
 #include <string>
 
 #include "zxml/tag.h"
@@ -271,14 +273,18 @@ std::vector<uint8_t> compressLevel9(const uint8_t* data, size_t size, const char
   std::vector<uint8_t> out;
   z_stream strm;
   std::memset(&strm, 0, sizeof strm);
-  if (deflateInit(&strm, Z_BEST_COMPRESSION) != Z_OK) return out;
+  // An empty stream would be saved as an inventory that holds nothing.
+  int ret = deflateInit(&strm, Z_BEST_COMPRESSION);
+  if (ret == Z_MEM_ERROR) throw std::bad_alloc();
+  CVN_CHECK(module, ret == Z_OK);
+  // Ends the stream however this returns, a std::bad_alloc below included.
+  std::unique_ptr<z_stream, int (*)(z_stream*)> stream_end(&strm, deflateEnd);
   // The bound zlib guarantees for level 9 with the default window: tiny or
   // incompressible input grows, and one spare output area keeps the loop
   // below from reallocating.
   out.reserve(size + (size >> 12) + (size >> 14) + (size >> 25) + 13 + kChunk + spare);
   size_t used = 0;
   size_t remaining = size;
-  int ret = Z_OK;
   for (;;) {
     bool last = remaining <= kChunk;
     size_t chunk = last ? remaining : kChunk;
@@ -299,7 +305,6 @@ std::vector<uint8_t> compressLevel9(const uint8_t* data, size_t size, const char
     if (last) break;
   }
   CVN_CHECK(module, ret == Z_STREAM_END);
-  deflateEnd(&strm);
   out.resize(used);
   return out;
 }
