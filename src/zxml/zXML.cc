@@ -178,7 +178,7 @@ char* writeAnnotations(char* out, const TagList<Annotation>& annotations) {
 
 // Writes the tag's lines; the flags affect this tag only, never its
 // descendants.
-char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
+char* writeTag(char* out, const Tag& tag, DumpClose close, DumpChildren children) {
   bool branch = tag.kind() == Tag::Kind::kBranch;
   *out++ = branch ? '+' : '*';
   out = writeName(out, tag.name());
@@ -194,9 +194,9 @@ char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
     out = writeAnnotations(out, p->annotations());
   }
   if (!branch) return out;
-  if (!no_children)
+  if (children == kWithChildren)
     for (const auto& c : tag.children()) out = writeTag(out, *c, kCloseTags, kWithChildren);
-  if (!no_close) {
+  if (close == kCloseTags) {
     *out++ = '-';
     *out++ = '\n';
   }
@@ -205,21 +205,19 @@ char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
 
 // Kept out of line: inlined into the callers, g++ loses track of the buffer
 // size and warns about the final NUL.
-__attribute__((noinline)) size_t writeDocument(const Tag& document, char* start, bool no_close,
-                                               bool no_children) {
+__attribute__((noinline)) size_t writeDocument(const Tag& document, char* start, DumpClose close,
+                                               DumpChildren children) {
   char* out = start;
   std::memcpy(out, kHeader, kHeaderLength);
   out += kHeaderLength;
-  for (const auto& c : document.children()) out = writeTag(out, *c, no_close, no_children);
+  for (const auto& c : document.children()) out = writeTag(out, *c, close, children);
   *out = '\0';
   return static_cast<size_t>(out - start);
 }
 
-void appendUint32(std::vector<uint8_t>& out, uint32_t value, bool native) {
-  if (!native) value = __builtin_bswap32(value);
-  uint8_t bytes[4];
-  std::memcpy(bytes, &value, 4);
-  out.insert(out.end(), bytes, bytes + 4);
+void appendUint32(std::vector<uint8_t>& out, uint32_t value, bool little_endian) {
+  for (int i = 0; i < 4; ++i)
+    out.push_back(static_cast<uint8_t>(value >> 8 * (little_endian ? i : 3 - i)));
 }
 
 // Sections of a split block: the top level alone, then each child of the top
@@ -315,12 +313,14 @@ size_t TagTree::textSize() const {
   return size + kSlack;
 }
 
-size_t TagTree::dumpText(char* buffer, size_t offset, bool no_close, bool no_children) const {
-  return writeDocument(document(), buffer + offset, no_close, no_children);
+size_t TagTree::dumpText(char* buffer, size_t offset, DumpClose close,
+                         DumpChildren children) const {
+  return writeDocument(document(), buffer + offset, close, children);
 }
 
-std::vector<uint8_t> TagTree::serialise(bool compressed, bool split) const {
-  if (split) return serialiseSplit(*this, compressed);
+std::vector<uint8_t> TagTree::serialise(BlockCompression compression, BlockLayout layout) const {
+  const bool compressed = compression == kCompressed;
+  if (layout == kSplitSections) return serialiseSplit(*this, compressed);
   size_t size = textSize();
   if (!compressed) {
     // The text padded with zeros to the estimated size; the zeros stand in
