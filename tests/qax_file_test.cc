@@ -65,6 +65,22 @@ TEST(SnapshotFileTest, SavedFilesReadBackInBothByteOrders) {
   }
 }
 
+// A split block's directory position is in the file's byte order; 65536
+// sections bytes read the other way round would be 256.
+TEST(SnapshotFileTest, SplitSectionsAreFoundInTheFilesByteOrder) {
+  for (bool little : {true, false}) {
+    TagTree tree(little, "Snapshot");
+    tree.top().setChildValue("c", TagValue(std::string(65536 - 24, 'v')));
+    SnapshotFile file(little);
+    file.addTree(tree, kSnapshotBlock, kSplitSections, kUncompressed);
+    std::vector<uint8_t> image = file.makeImage(kCompressedDirectory);
+    QaxFile read;
+    std::string error;
+    ASSERT_TRUE(parseQaxImage(image.data(), image.size(), &read, &error)) << error;
+    EXPECT_EQ(read.blocks[0].text.size(), 65536u);
+  }
+}
+
 // 2014-10-29 12:00:00 UTC.
 constexpr int64_t kMoment = 1414584000;
 

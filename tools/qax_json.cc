@@ -129,7 +129,7 @@ std::string renderQaxJson(const QaxFile& file) {
       appendJsonString(b.id, out);
     }
     if (b.kind == QaxBlock::Kind::kRawData) {
-      out += ", \"inflated_size\": " + std::to_string(b.data.size()) + "}";
+      out += ", \"inflated_size\": " + std::to_string(b.inflated_size) + "}";
       continue;
     }
     out += ",\n     \"trees\": [";

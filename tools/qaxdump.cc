@@ -69,7 +69,10 @@ int main(int argc, char** argv) {
   if (!path) return usage();
   cvn::QaxFile file;
   std::string error;
-  if (!cvn::readQaxFile(path, &file, &error)) {
+  // Only the dump shows the blocks as stored; the others need the trees.
+  cvn::QaxReadOptions options;
+  options.keep_inflated = !mode;
+  if (!cvn::readQaxFile(path, &file, &error, options)) {
     std::fprintf(stderr, "qaxdump: %s: %s\n", path, error.c_str());
     return 1;
   }
