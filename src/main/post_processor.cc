@@ -3,20 +3,22 @@
 #include <functional>
 
 #include "sections/sections.h"
+#include "sections/written_volumes.h"
 
 namespace cvn {
 
 void postProcess(TagTree& snapshot, const TagTree& raw, bool log, CommandRunner& runner,
                  FileSystem& files, std::FILE* out) {
+  WrittenVolumes volumes;  // shared by the disks and the USB media
   const std::function<void()> steps[] = {
       [&] { buildSystemSection(snapshot, raw, runner); },
       [&] { buildProcessorsSection(snapshot, raw); },
       [&] { buildMemorySection(snapshot, raw); },
       [&] { buildDisplaysSection(snapshot, raw); },
-      [&] { buildStorageSection(snapshot, raw); },
+      [&] { buildStorageSection(snapshot, raw, volumes); },
       [&] { buildNetworkAdaptersSection(snapshot, raw); },
       [&] { buildPrintersSection(snapshot, raw); },
-      [&] { buildUsbSection(snapshot, raw, runner); },
+      [&] { buildUsbSection(snapshot, raw, runner, volumes); },
       [&] { buildOperatingSystemSection(snapshot, raw); },
       [&] { buildUsersSection(snapshot, runner); },
       [&] { buildApplicationsSection(snapshot, raw); },
