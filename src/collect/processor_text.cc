@@ -3,7 +3,7 @@
 #include <cmath>
 #include <cstdlib>
 
-#include "zxml/size_text.h"
+#include "zxml/trim_text.h"
 
 namespace cvn {
 

@@ -15,6 +15,7 @@
 #include "sections/volume_fields.h"
 #include "sections/written_volumes.h"
 #include "zxml/size_text.h"
+#include "zxml/trim_text.h"
 
 namespace cvn {
 namespace {

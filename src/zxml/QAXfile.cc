@@ -4,7 +4,7 @@
 #include <ctime>
 
 #include "zxml/date_text.h"
-#include "zxml/size_text.h"
+#include "zxml/format_text.h"
 #include "zxml/tag.h"
 #include "zxml/zXML.h"
 
