@@ -42,7 +42,7 @@ const cvn::TagTree& sampleTree() {
 std::string dumpedText() {
   const cvn::TagTree& tree = sampleTree();
   std::string text(tree.textSize(), '\0');
-  text.resize(tree.dumpText(&text[0], 0, false, false));
+  text.resize(tree.dumpText(&text[0], 0, cvn::kCloseTags, cvn::kWithChildren));
   return text;
 }
 
@@ -51,7 +51,7 @@ void BM_MeasureAndDump(benchmark::State& state) {
   size_t length = 0;
   for (auto _ : state) {
     std::vector<char> buffer(tree.textSize(), '\0');
-    length = tree.dumpText(buffer.data(), 0, false, false);
+    length = tree.dumpText(buffer.data(), 0, cvn::kCloseTags, cvn::kWithChildren);
     benchmark::DoNotOptimize(buffer.data());
   }
   state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * length));
@@ -77,7 +77,7 @@ void BM_Serialise(benchmark::State& state) {
   const cvn::TagTree& tree = sampleTree();
   size_t text_size = dumpedText().size();
   for (auto _ : state) {
-    std::vector<uint8_t> block = tree.serialise(true, false);
+    std::vector<uint8_t> block = tree.serialise(cvn::kCompressed, cvn::kWholeText);
     benchmark::DoNotOptimize(block.data());
   }
   state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * text_size));

@@ -40,7 +40,10 @@ done
 # Every source file, found afresh on each run: a file added under src/ is
 # built here without anyone editing this script.
 mapfile -t agent_sources < <(find src -name '*.cc' | LC_ALL=C sort)
-mapfile -t qaxdump_sources < <(find tools -name '*.cc' | LC_ALL=C sort)
+# The inspector links nothing of the agent but its UTF-8 walker.
+mapfile -t qaxdump_sources < <( (find tools -name '*.cc'; echo src/zxml/utf8_text.cc) | LC_ALL=C sort)
+# Each file is compiled once, however many programs it goes into.
+mapfile -t all_sources < <(printf '%s\n' "${agent_sources[@]}" "${qaxdump_sources[@]}" | LC_ALL=C sort -u)
 
 cxxflags=(-std=c++17 -O2 -DNDEBUG -Wall -Wextra -Werror -Isrc -Itools
           -isystem "$stubs/include" -isystem "$out/include")
@@ -64,7 +67,7 @@ for i in "${!arch_names[@]}"; do
   target=${zig_targets[$i]}
   echo "-- macOS $arch: compiling ${#agent_sources[@]} agent and ${#qaxdump_sources[@]} inspector sources"
   objects="$out/$arch/obj"
-  compile "$target" "$objects" "${agent_sources[@]}" "${qaxdump_sources[@]}"
+  compile "$target" "$objects" "${all_sources[@]}"
 
   # A platform guard that stops matching would silently empty these files.
   for source in $(printf '%s\n' "${agent_sources[@]}" | grep '_darwin\.cc$'); do

@@ -10,6 +10,7 @@
 #include "corpus_files.h"
 #include "fake_command_runner.h"
 #include "sections/sections.h"
+#include "sections/written_volumes.h"
 #include "tree_text.h"
 #include "zxml/tag.h"
 
@@ -25,8 +26,9 @@ std::string diskSizes(const std::string& file) {
   PlistConverter(raw).convertPlist(root);
   TagTree snapshot(true, "Snapshot");
   FakeCommandRunner runner;
-  buildStorageSection(snapshot, raw);
-  buildUsbSection(snapshot, raw, runner);
+  WrittenVolumes volumes;
+  buildStorageSection(snapshot, raw, volumes);
+  buildUsbSection(snapshot, raw, runner, volumes);
   const Tag* storage = snapshot.top().findChild("Storage");
   if (!storage) return "no disks";
   std::string out;
@@ -58,7 +60,8 @@ std::string storageText(const std::filesystem::path& file) {
   TagTree raw(true, "Macintosh");
   PlistConverter(raw).convertPlist(root);
   TagTree snapshot(true, "Snapshot");
-  buildStorageSection(snapshot, raw);
+  WrittenVolumes volumes;
+  buildStorageSection(snapshot, raw, volumes);
   return treeText(snapshot.top().findChild("Storage"));
 }
 

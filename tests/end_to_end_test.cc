@@ -387,6 +387,17 @@ TEST_F(EndToEndTest, TheModernMacGivesTheCommittedResult) {
   }
 }
 
+// Profilers that name their DTD over https print a header one byte longer
+// than the one the outputs are spliced by; the result must not change.
+TEST_F(EndToEndTest, AnHttpsDoctypeGivesTheSameResult) {
+  const std::string profiler = copySampleMac() + "/profiler/";
+  for (const auto& entry : std::filesystem::directory_iterator(profiler))
+    replaceOnce(entry.path().string(), "\"http://www.apple.com/", "\"https://www.apple.com/");
+  ASSERT_EQ(run({"-silent"}).out, ">>>" + kSampleName + "\n");
+  EXPECT_EQ(stableResultText(readResult(kSampleName)),
+            readFile(kSource + "/tests/sample_mac/expected_result.txt"));
+}
+
 TEST_F(EndToEndTest, DebugScanKeepsTheProfilersWholeOutput) {
   ASSERT_EQ(run({"-debug", "-silent"}).out, ">>>" + kSampleName + "\n");
   QaxFile file = readResult(kSampleName);

@@ -16,7 +16,7 @@
 #include "collect/command_runner.h"
 #include "fake_command_runner.h"
 #include "tree_text.h"
-#include "zxml/size_text.h"
+#include "zxml/trim_text.h"
 
 namespace cvn {
 namespace {

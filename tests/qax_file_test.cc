@@ -4,7 +4,6 @@
 #include <stdlib.h>
 #include <time.h>
 
-#include <cstdio>
 #include <string>
 #include <vector>
 
@@ -16,7 +15,7 @@ namespace cvn {
 namespace {
 
 // Files in both byte orders: directory, trailer, and trees that come back
-// from the saved file with the same names, kinds, value texts and order.
+// from the file image with the same names, kinds, value texts and order.
 TEST(SnapshotFileTest, SavedFilesReadBackInBothByteOrders) {
   std::vector<uint8_t> image = SnapshotFile(true).makeImage(false);
   EXPECT_EQ(std::string(image.begin(), image.end()),
@@ -25,20 +24,19 @@ TEST(SnapshotFileTest, SavedFilesReadBackInBothByteOrders) {
   snapshot.setValue("/timestamp", TagValue("20141029120000.000000+60"));
   snapshot.setValue("/Memory/size", TagValue(4.0), "base-value", "4294967296");
   snapshot.top().addChild("Disks").setChildValue("disk:1", TagValue("HD")).addAnnotation("k", "");
-  TagTree odd(true, "Snapshot");                     // counted as a snapshot by its top name
-  odd.setValue("/timestamp", TagValue(int64_t{5}));  // not text: empty timestamp
-  odd.setValue("/info", TagValue("line one\nline two"));
-  std::string path = ::testing::TempDir() + "/round_trip.qax";
   for (bool little : {true, false}) {
+    TagTree odd(little, "Snapshot");                   // counted as a snapshot by its top name
+    odd.setValue("/timestamp", TagValue(int64_t{5}));  // not text: empty timestamp
+    odd.setValue("/info", TagValue("line one\nline two"));
     SnapshotFile file(little);
-    file.addTree(snapshot, kSnapshotBlock, false, true);
-    file.addTree(odd, kSnapshotBlock, true, true);
-    file.addTree(odd, kAssetInfoBlock, false, false);
+    file.addTree(snapshot, kSnapshotBlock, kWholeText, kCompressed);
+    file.addTree(odd, kSnapshotBlock, kSplitSections, kCompressed);
+    file.addTree(odd, kAssetInfoBlock, kWholeText, kUncompressed);
     file.addRawData(reinterpret_cast<const uint8_t*>("payload"), 7);
-    ASSERT_TRUE(file.save(path, true));
+    image = file.makeImage(true);
     QaxFile read;
     std::string error;
-    ASSERT_TRUE(readQaxFile(path, &read, &error)) << error;
+    ASSERT_TRUE(parseQaxImage(image.data(), image.size(), &read, &error)) << error;
     std::vector<uint64_t> at = {0};
     for (const auto& b : file.blocks()) at.push_back(at.back() + b->length());
     auto entry = [&](int i, const std::string& rest) {
@@ -52,12 +50,11 @@ TEST(SnapshotFileTest, SavedFilesReadBackInBothByteOrders) {
                   entry(3, "customdata\nID=rawdata"));
     std::string trailer(8, '\0');
     for (int i = 0; i < 2; ++i) trailer[little ? i : 7 - i] = static_cast<char>(at[4] >> (8 * i));
-    image = file.makeImage(true);
     EXPECT_EQ(std::string(image.end() - 14, image.end()), trailer + "\x03\x01QAX!");
     for (size_t i = 0; i < 3; ++i) {
       const TagTree& original = i == 0 ? snapshot : odd;
       std::string text(original.textSize(), '\0');
-      text.resize(original.dumpText(&text[0], 0, false, false));
+      text.resize(original.dumpText(&text[0], 0, kCloseTags, kWithChildren));
       EXPECT_EQ(renderZxmlText(read.blocks[i].tree), text);
     }
     EXPECT_EQ(read.blocks[3].data, "payload");
@@ -66,8 +63,22 @@ TEST(SnapshotFileTest, SavedFilesReadBackInBothByteOrders) {
               "block 1 (snapshot, offset " + std::to_string(at[1]) +
                   ") line 5: no \"=\"; taken as the continuation of the value above");
   }
-  std::remove(path.c_str());
-  EXPECT_FALSE(SnapshotFile(true).save("/nonexistent-dir/x.qax", true));
+}
+
+// A split block's directory position is in the file's byte order; 65536
+// sections bytes read the other way round would be 256.
+TEST(SnapshotFileTest, SplitSectionsAreFoundInTheFilesByteOrder) {
+  for (bool little : {true, false}) {
+    TagTree tree(little, "Snapshot");
+    tree.top().setChildValue("c", TagValue(std::string(65536 - 24, 'v')));
+    SnapshotFile file(little);
+    file.addTree(tree, kSnapshotBlock, kSplitSections, kUncompressed);
+    std::vector<uint8_t> image = file.makeImage(kCompressedDirectory);
+    QaxFile read;
+    std::string error;
+    ASSERT_TRUE(parseQaxImage(image.data(), image.size(), &read, &error)) << error;
+    EXPECT_EQ(read.blocks[0].text.size(), 65536u);
+  }
 }
 
 // 2014-10-29 12:00:00 UTC.

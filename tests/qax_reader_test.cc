@@ -5,6 +5,7 @@
 #include <string>
 #include <vector>
 
+#include "qax_json.h"
 #include "zxml/zXML.h"
 
 namespace cvn {
@@ -30,10 +31,14 @@ std::string entry(size_t offset, size_t length, const char* type = "snapshot") {
          "\ntype=" + type + "\n";
 }
 
-std::string readError(const std::string& bytes) {
+std::string readError(const std::string& bytes, uint64_t budget = uint64_t{1} << 30) {
   QaxFile file;
   std::string error;
-  parseQaxImage(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size(), &file, &error);
+  QaxReadOptions options;
+  options.budget = budget;
+  options.keep_inflated = false;
+  parseQaxImage(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size(), &file, &error,
+                options);
   return error;
 }
 
@@ -54,6 +59,17 @@ TEST(QaxReaderTest, DamageIsNamed) {
   flipped[5] ^= 0x55;
   std::string deep = kHeader;
   for (int i = 0; i < 300; ++i) deep += "+t=\n";
+  // One budget for the whole file: inflated bytes, and what each line of
+  // tree text can become.
+  std::string wide = compressed(kHeader + "*S=" + std::string(100000, 'v') + "\n") +
+                     std::string("\x00\x01ZXML", 6);
+  std::string two_wide =
+      image(wide + wide, "[H]\ncount=2\nsnapshotcount=2\n" + entry(0, wide.size()) +
+                             "[1]\noffset=" + std::to_string(wide.size()) +
+                             "\nlength=" + std::to_string(wide.size()) + "\ntype=snapshot\n");
+  std::string short_lines = kHeader + "+S=\n";
+  for (int i = 0; i < 20000; ++i) short_lines += "a=\n";
+  std::string many = compressed(short_lines + "-\n") + std::string("\x00\x01ZXML", 6);
   const std::pair<std::string, std::string> cases[] = {
       {readError("QAX!"), "file of 4 bytes is too short for the 14-byte trailer"},
       {readError(good.substr(0, good.size() - 1)), "no \"QAX!\" magic in the last 4 bytes"},
@@ -79,6 +95,11 @@ TEST(QaxReaderTest, DamageIsNamed) {
       {readError(image(std::string("\x00\x02ZXML", 6), head + entry(0, 6))),
        "block 0 (snapshot, offset 0): unknown block flags 0/2 before \"ZXML\""},
       {readError(flipped).substr(0, 30), "block 0 (snapshot, offset 0): "},
+      {readError(two_wide, 150000), "block 1 (snapshot, offset " + std::to_string(wide.size()) +
+                                        "): inflated data passes the budget of 150000 bytes for "
+                                        "the whole file"},
+      {readError(image(many, head + entry(0, many.size())), 1 << 20),
+       "block 0 (snapshot, offset 0): inflated data passes the budget of 1 MiB for the whole file"},
       {parseError("+Snapshot=\n-\n"), "line 1: no \"?zxml\" header line with the byte-order mark"},
       {parseError(kHeader), "line 1: no top tag"},
       {parseError(kHeader + "+Snapshot=\n"), "line 2: 1 tags still open at the end"},
@@ -123,6 +144,26 @@ TEST(QaxReaderTest, TextThatReadsTwoWaysIsNamed) {
     std::vector<std::string> ambiguities;
     EXPECT_TRUE(parseZxmlText(kHeader + c.first, &tree, nullptr, &error, 0, &ambiguities)) << error;
     EXPECT_EQ(ambiguities, c.second) << c.first;
+  }
+}
+
+// Only well-formed UTF-8 passes into the JSON; every other byte becomes the
+// character of its code, so any strict decoder reads the output.
+TEST(QaxReaderTest, JsonCarriesOnlyWellFormedUtf8) {
+  const std::pair<std::string, std::string> cases[] = {
+      {"caf\xC3\xA9 \xF0\x9F\x98\x80", "caf\xC3\xA9 \xF0\x9F\x98\x80"},
+      {"\xF8\x80\x80", "\\u00f8\\u0080\\u0080"},             // no lead byte past F4
+      {"\xC0\xAF", "\\u00c0\\u00af"},                        // overlong
+      {"\xED\xA0\x80", "\\u00ed\\u00a0\\u0080"},             // surrogate
+      {"\xF4\x90\x80\x80", "\\u00f4\\u0090\\u0080\\u0080"},  // past U+10FFFF
+      {"\xE2\x82", "\\u00e2\\u0082"},                        // cut off
+  };
+  for (const auto& c : cases) {
+    QaxFile file;
+    file.blocks.emplace_back();
+    file.blocks[0].tree.nodes.push_back(QaxNode{"S", false, c.first, {}, {}, {}});
+    std::string json = renderQaxJson(file);
+    EXPECT_NE(json.find("\"value\": \"" + c.second + "\""), std::string::npos) << c.second;
   }
 }
 

@@ -8,6 +8,8 @@
 #include <utility>
 #include <vector>
 
+#include "collect/processor_text.h"
+
 namespace cvn {
 namespace {
 
@@ -47,9 +49,9 @@ TEST(QuickFactsTest, AppleSiliconChipCoresAndMaker) {
 TEST(QuickFactsTest, LateIntelWithADecimalCommaAndEveryOlderForm) {
   const std::pair<const char*, const char*> cases[] = {
       {"<key>cpu_type</key><string>Quad-Core Intel Core i7</string>"
-       "<key>current_processor_speed</key><string>2,3 GHz</string>"
+       "<key>current_processor_speed</key><string>2,01 GHz</string>"
        "<key>number_processors</key><integer>4</integer><key>packages</key><integer>1</integer>",
-       "packages=1\ncores=4\nspeed=2300\nmodel=Quad-Core Intel Core i7\nmaker=GenuineIntel\n"},
+       "packages=1\ncores=4\nspeed=2010\nmodel=Quad-Core Intel Core i7\nmaker=GenuineIntel\n"},
       // A text count that is not Apple Silicon's is passed on as it is;
       // without a chip nothing invents a package count.
       {"<key>cpu_type</key><string>PowerPC G4</string>"
@@ -67,6 +69,14 @@ TEST(QuickFactsTest, LateIntelWithADecimalCommaAndEveryOlderForm) {
         factsText(profilerList({{"SPHardwareDataType", std::string("<dict>") + keys + "</dict>"}}));
     EXPECT_EQ(text.substr(0, text.find("memory=")), expected) << keys;
   }
+}
+
+// The summary and the Processors section read the speed through this.
+TEST(QuickFactsTest, ClockSpeedIsRoundedToTheNearestMegahertz) {
+  const std::pair<const char*, int64_t> cases[] = {
+      {"2.01 GHz", 2010}, {"2.0096 GHz", 2010}, {"2.0094 GHz", 2009}, {"867 MHz", 867},
+      {"3 GHz", 3000},    {"GHz", 0},           {"-1 GHz", 0},        {"nan GHz", 0}};
+  for (const auto& [text, megahertz] : cases) EXPECT_EQ(megahertzOfSpeedText(text), megahertz);
 }
 
 TEST(QuickFactsTest, DiskCapacityCountsNvmeDisksButNotTheirContainers) {

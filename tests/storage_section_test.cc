@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include "sections/sections.h"
+#include "sections/written_volumes.h"
 #include "tree_text.h"
 #include "zxml/tag.h"
 
@@ -35,7 +36,8 @@ TEST(StorageSectionTest, DisksDrivesAndVolumesOfAllBuses) {
                TagValue("HL-DT-ST DVD"));
 
   TagTree snapshot(true, "Snapshot");
-  buildStorageSection(snapshot, raw);
+  WrittenVolumes volumes;
+  buildStorageSection(snapshot, raw, volumes);
   EXPECT_EQ(treeText(snapshot.top().findChild("Storage")), R"(+Storage=
 +Physical-disks=
 *HDD:1=
@@ -102,7 +104,8 @@ TEST(StorageSectionTest, SizeRoundingAndUsedShare) {
     if (c.volume_size) raw.setValue(disk + "volumes/item0/size", TagValue(c.volume_size));
     if (c.volume_free) raw.setValue(disk + "volumes/item0/free_space", TagValue(c.volume_free));
     TagTree snapshot(true, "Snapshot");
-    buildStorageSection(snapshot, raw);
+    WrittenVolumes volumes;
+    buildStorageSection(snapshot, raw, volumes);
     const Tag* storage = snapshot.top().findChild("Storage");
     const TagProperty* size = storage->firstChild()->firstChild()->findProperty("size");
     const TagProperty* used =
@@ -182,7 +185,8 @@ TEST(StorageSectionTest, NvmeDisksAndMountedVolumesEachOnce) {
   raw.setValue("/SPStorageDataType/_items/item6/size_in_bytes", TagValue(int64_t{1000}));
 
   TagTree snapshot(true, "Snapshot");
-  buildStorageSection(snapshot, raw);
+  WrittenVolumes volumes;
+  buildStorageSection(snapshot, raw, volumes);
   EXPECT_EQ(treeText(snapshot.top().findChild("Storage")), R"(+Storage=
 +Physical-disks=
 *HDD:1=

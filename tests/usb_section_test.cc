@@ -5,6 +5,7 @@
 
 #include "fake_command_runner.h"
 #include "sections/sections.h"
+#include "sections/written_volumes.h"
 #include "tree_text.h"
 #include "zxml/tag.h"
 
@@ -49,11 +50,12 @@ TEST(UsbSectionTest, HubsDevicesAndFlashDriveAfterInternalDisks) {
            {"removable_media", TagValue("Yes")}});
 
   TagTree snapshot(true, "Snapshot");
-  buildStorageSection(snapshot, raw);
+  WrittenVolumes volumes;
+  buildStorageSection(snapshot, raw, volumes);
   FakeCommandRunner runner;
   runner.answer("diskutil info /dev/disk2",
                 "   Device / Media Name:      Lexar USB Flash Drive Media\n   Protocol: USB\n");
-  buildUsbSection(snapshot, raw, runner);
+  buildUsbSection(snapshot, raw, runner, volumes);
   EXPECT_EQ(treeText(&snapshot.top()), R"(+Snapshot=
 +Storage=
 +Physical-disks=
@@ -105,7 +107,8 @@ TEST(UsbSectionTest, BsdNameReachesTheShellQuoted) {
             {{"removable_media", TagValue("yes")}, {"bsd_name", bsd_name}});
     TagTree snapshot(true, "Snapshot");
     FakeCommandRunner runner;
-    buildUsbSection(snapshot, raw, runner);
+    WrittenVolumes volumes;
+    buildUsbSection(snapshot, raw, runner, volumes);
     EXPECT_EQ(runner.commands_ran_, commands) << bsd_name.textForm();
   }
 }
@@ -121,7 +124,8 @@ TEST(UsbSectionTest, WalksNestedHubsUpToABound) {
   raw.setValue(path + "item0/_name", TagValue("Too deep"));
   TagTree snapshot(true, "Snapshot");
   FakeCommandRunner runner;
-  buildUsbSection(snapshot, raw, runner);
+  WrittenVolumes volumes;
+  buildUsbSection(snapshot, raw, runner, volumes);
   EXPECT_EQ(treeText(snapshot.top().findChild("Peripherals")),
             "+Peripherals=\n+USB=\n*Device:1=\"Keyboard\"\n-\n-\n");
 }
@@ -170,10 +174,11 @@ TEST(UsbSectionTest, AStickWhoseDiskSitsInAMediaList) {
            {"free_space", TagValue("6 GB")}});
 
   TagTree snapshot(true, "Snapshot");
-  buildStorageSection(snapshot, raw);
+  WrittenVolumes volumes;
+  buildStorageSection(snapshot, raw, volumes);
   FakeCommandRunner runner;
   runner.answer("diskutil info /dev/disk8", "   Device / Media Name:      HARMONY MSC Media\n");
-  buildUsbSection(snapshot, raw, runner);
+  buildUsbSection(snapshot, raw, runner, volumes);
   EXPECT_EQ(treeText(&snapshot.top()), R"(+Snapshot=
 +Storage=
 +Logical-disks=
@@ -253,7 +258,8 @@ TEST(UsbSectionTest, DevicesOfTheHostTypeWhenTheOlderTypeHasNone) {
   }
   TagTree snapshot(true, "Snapshot");
   FakeCommandRunner runner;
-  buildUsbSection(snapshot, raw, runner);
+  WrittenVolumes volumes;
+  buildUsbSection(snapshot, raw, runner, volumes);
   EXPECT_EQ(treeText(&snapshot.top()), R"(+Snapshot=
 +Peripherals=
 +USB=
@@ -280,7 +286,8 @@ device-speed="480"
   // While the older type lists a device, the host type is not read.
   raw.setValue("/SPUSBDataType/_items/item0/_items/item0/_name", TagValue("IR Receiver"));
   TagTree older(true, "Snapshot");
-  buildUsbSection(older, raw, runner);
+  WrittenVolumes older_volumes;
+  buildUsbSection(older, raw, runner, older_volumes);
   EXPECT_EQ(treeText(older.top().findChild("Peripherals")), R"(+Peripherals=
 +USB=
 *Device:1="IR Receiver"

@@ -20,7 +20,7 @@ const std::string kHeader = "\xEF\xBB\xBF?zxml\n";
 // The dump must fit the size estimate: the block writers allocate by it.
 std::string dump(const TagTree& tree) {
   std::string buffer(tree.textSize(), '\0');
-  size_t n = tree.dumpText(&buffer[0], 0, false, false);
+  size_t n = tree.dumpText(&buffer[0], 0, kCloseTags, kWithChildren);
   EXPECT_LE(n + 1, buffer.size());
   return buffer.substr(0, n);
 }
@@ -42,10 +42,11 @@ TEST(ZxmlTest, LineKindsValueTextsAndBlocks) {
                      "+AssetInfo=\n~complex=\nyes=true\nno=false\nneg=-9223372036854775808\nnone=\n"
                      "odd=a=b~c+d*e-f\n~base-value=1024\n*leaf=1.00\n~split=,\n*bare=\n-\n";
   EXPECT_EQ(dump(tree), text);
-  std::vector<uint8_t> plain = tree.serialise(false, false);  // padded to the estimate
+  std::vector<uint8_t> plain = tree.serialise(kUncompressed, kWholeText);  // padded to the estimate
   EXPECT_EQ(std::string(plain.begin(), plain.end()),
             text + std::string(tree.textSize() - text.size(), '\0'));
-  std::vector<uint8_t> packed = tree.serialise(true, false);  // inflated in qax_file_test
+  std::vector<uint8_t> packed =
+      tree.serialise(kCompressed, kWholeText);  // inflated in qax_file_test
   EXPECT_EQ(std::string(packed.end() - 6, packed.end()), std::string("\x00\x01ZXML", 6));
 }
 
@@ -73,7 +74,7 @@ TEST(ZxmlTest, SplitBlockHasSectionsAndDirectory) {
   std::string directory = "[Root]\noffset=0\nlength=20\n[A]\noffset=20\nlength=20\n";
   // Not the native order: the position is stored big-endian on this target.
   std::string position = std::string(3, '\0') + static_cast<char>(sections.size());
-  std::vector<uint8_t> split = split_tree.serialise(false, true);
+  std::vector<uint8_t> split = split_tree.serialise(kUncompressed, kSplitSections);
   EXPECT_EQ(std::string(split.begin(), split.end()),
             sections + directory + position + std::string("\x01\x00", 2));
 }
@@ -104,6 +105,11 @@ TEST(ZxmlTest, CollectedTextCannotWriteMarkup) {
       {"Soft:Carol\n plain", kName, "Soft:Carol  plain"},
       {std::string("Soft:a\0b", 8), kName, "Soft:a"},
       {"Soft:+*-~", kName, "Soft:+*-~"},
+      {"+Evil", kName, "_Evil"},
+      {"-", kName, "_"},
+      {"~k\n-", kName, "_k -"},
+      {"*x=1", kName, "_x_1"},
+      {"-1", kValue, "-1"},
       // Cut at the limit, backing off to the start of a split UTF-8 sequence.
       {almost + "ab", kValue, almost + "a"},
       {almost + "\xC3\xA9", kValue, almost},

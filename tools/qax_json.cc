@@ -2,6 +2,8 @@
 
 #include <string>
 
+#include "zxml/utf8_text.h"
+
 namespace cvn {
 
 // Valid UTF-8 passes through; any other byte is written as the Latin-1
@@ -38,18 +40,10 @@ void appendJsonString(std::string_view s, std::string& out) {
       ++i;
       continue;
     }
-    size_t len = c >= 0xF0 && c <= 0xF4 ? 4 : c >= 0xE0 ? 3 : c >= 0xC2 && c < 0xE0 ? 2 : 0;
-    bool valid = len > 0 && i + len <= s.size();
-    for (size_t k = 1; valid && k < len; ++k)
-      valid = (static_cast<unsigned char>(s[i + k]) & 0xC0) == 0x80;
-    if (valid && len == 3) {
-      unsigned char c1 = static_cast<unsigned char>(s[i + 1]);
-      valid = !(c == 0xE0 && c1 < 0xA0) && !(c == 0xED && c1 >= 0xA0);
-    } else if (valid && len == 4) {
-      unsigned char c1 = static_cast<unsigned char>(s[i + 1]);
-      valid = !(c == 0xF0 && c1 < 0x90) && !(c == 0xF4 && c1 >= 0x90);
-    }
-    if (valid) {
+    uint32_t code_point = 0;
+    size_t len = utf8SequenceLength(reinterpret_cast<const unsigned char*>(s.data()) + i,
+                                    s.size() - i, &code_point);
+    if (len > 0) {
       out.append(s.substr(i, len));
       i += len;
     } else {
@@ -135,7 +129,7 @@ std::string renderQaxJson(const QaxFile& file) {
       appendJsonString(b.id, out);
     }
     if (b.kind == QaxBlock::Kind::kRawData) {
-      out += ", \"inflated_size\": " + std::to_string(b.data.size()) + "}";
+      out += ", \"inflated_size\": " + std::to_string(b.inflated_size) + "}";
       continue;
     }
     out += ",\n     \"trees\": [";

@@ -1,12 +1,12 @@
 #include "qax_reader.h"
 
-#include <zlib.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
 #include <memory>
+
+#include "qax_inflate.h"
 
 namespace cvn {
 
@@ -14,65 +14,21 @@ namespace {
 
 constexpr size_t kTrailerLength = 14;
 constexpr size_t kBlockTrailerLength = 6;
-// Real snapshots inflate to a few megabytes; anything far beyond is a bomb.
-constexpr size_t kMaxInflated = size_t{256} << 20;
 constexpr uint64_t kMaxFileSize = uint64_t{1} << 31;
+// The most one line of tree text can grow into once read: a node with the
+// spare room of the list that holds it and the heap's share of its two
+// texts, or a warning and an ambiguity about the line.
+constexpr uint64_t kLineCost = 2 * sizeof(QaxNode) + 64;
 
 std::string numberText(uint64_t n) { return std::to_string(n); }
 
 }  // namespace
 
 bool inflateQaxStream(const uint8_t* data, size_t size, std::string* out, std::string* error) {
-  z_stream strm;
-  std::memset(&strm, 0, sizeof strm);
-  if (inflateInit(&strm) != Z_OK) {
-    *error = "cannot start zlib";
-    return false;
-  }
-  std::unique_ptr<z_stream, int (*)(z_stream*)> guard(&strm, inflateEnd);
-  out->clear();
-  const size_t kStep = 65536;
-  size_t used = 0;
-  strm.next_in = const_cast<Bytef*>(data);
-  strm.avail_in = static_cast<uInt>(size);
-  for (;;) {
-    if (used >= kMaxInflated) {
-      *error = "zlib stream inflates to more than " + numberText(kMaxInflated >> 20) + " MiB";
-      return false;
-    }
-    size_t room = std::min(kStep, kMaxInflated - used);
-    out->resize(used + room);
-    strm.next_out = reinterpret_cast<Bytef*>(&(*out)[used]);
-    strm.avail_out = static_cast<uInt>(room);
-    int ret = inflate(&strm, Z_NO_FLUSH);
-    used += room - strm.avail_out;
-    if (ret == Z_STREAM_END) break;
-    if (ret == Z_OK) continue;
-    if (ret == Z_BUF_ERROR && strm.avail_in == 0) {
-      *error = "zlib stream is truncated (ends after " + numberText(size) + " bytes)";
-      return false;
-    }
-    if (ret == Z_BUF_ERROR) {
-      *error = "zlib stream makes no progress at byte " + numberText(size - strm.avail_in);
-      return false;
-    }
-    *error = std::string("corrupt zlib stream at byte ") + numberText(size - strm.avail_in) +
-             (strm.msg ? std::string(": ") + strm.msg : std::string());
-    return false;
-  }
-  out->resize(used);
-  if (strm.avail_in != 0) {
-    *error = numberText(strm.avail_in) + " bytes follow the end of the zlib stream";
-    return false;
-  }
-  return true;
+  return inflateWithin(data, size, out, nullptr, error);
 }
 
 namespace {
-
-bool inflateStream(const uint8_t* data, size_t size, std::string* out, std::string* error) {
-  return inflateQaxStream(data, size, out, error);
-}
 
 bool parseNumber(std::string_view text, uint64_t* value) {
   if (text.empty() || text.size() > 19) return false;
@@ -229,10 +185,28 @@ void addWarnings(const QaxBlock& b, const std::vector<std::string>& found,
   for (const std::string& w : found) into.push_back(blockWhere(b) + " " + w);
 }
 
-bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::string* error) {
-  std::string detail;
-  std::vector<std::string> warnings;
+// What a tree block holds once its trailer is read: the payload as stored
+// (inflated when it was compressed) and how much of it is ZXML text.
+struct TreePayload {
+  std::string inflated;
+  std::string_view stored;
+  size_t text_length = 0;
   size_t allowed_open = 0;
+};
+
+bool readTreePayload(const uint8_t* p, size_t n, QaxBlock* b, bool little_endian,
+                     InflateBudget& budget, TreePayload* out, std::string* error) {
+  // Text stored plain is paid for too: its tree costs as much.
+  auto take = [&](size_t payload_length) {
+    std::string detail;
+    bool taken = b->compressed ? inflateWithin(p, payload_length, &out->inflated, &budget, &detail)
+                               : budget.take(payload_length, &detail);
+    if (!taken) *error = blockWhere(*b) + ": " + detail;
+    out->stored = b->compressed
+                      ? std::string_view(out->inflated)
+                      : std::string_view(reinterpret_cast<const char*>(p), payload_length);
+    return taken;
+  };
   if (n >= kBlockTrailerLength && std::memcmp(p + n - 4, "ZXML", 4) == 0) {
     uint8_t split = p[n - 6], compressed = p[n - 5];
     if (split != 0 || compressed > 1) {
@@ -241,40 +215,28 @@ bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::
       return false;
     }
     b->compressed = compressed == 1;
-    size_t payload = n - kBlockTrailerLength;
-    if (b->compressed) {
-      if (!inflateStream(p, payload, &b->text, &detail)) {
-        *error = blockWhere(*b) + ": " + detail;
-        return false;
-      }
-    } else {
-      b->text.assign(reinterpret_cast<const char*>(p), payload);
-    }
-  } else if (n >= kBlockTrailerLength && p[n - 2] == 1 && p[n - 1] <= 1) {
-    // Split layout: sections, section directory, its position, two flags.
+    if (!take(n - kBlockTrailerLength)) return false;
+    out->text_length = out->stored.size();
+    return true;
+  }
+  if (n >= kBlockTrailerLength && p[n - 2] == 1 && p[n - 1] <= 1) {
+    // Split layout: sections, section directory, its position in the byte
+    // order the file's trailer showed, two flags.
     b->split = true;
     b->compressed = p[n - 1] == 1;
-    uint32_t position;
-    std::memcpy(&position, p + n - 6, 4);
-    std::string payload;
-    if (b->compressed) {
-      if (!inflateStream(p, n - kBlockTrailerLength, &payload, &detail)) {
-        *error = blockWhere(*b) + ": " + detail;
-        return false;
-      }
-    } else {
-      payload.assign(reinterpret_cast<const char*>(p), n - kBlockTrailerLength);
-    }
-    if (position > payload.size()) position = __builtin_bswap32(position);
-    if (position > payload.size()) {
+    uint32_t position = 0;
+    for (int i = 0; i < 4; ++i)
+      position |= static_cast<uint32_t>(p[n - 6 + i]) << 8 * (little_endian ? i : 3 - i);
+    if (!take(n - kBlockTrailerLength)) return false;
+    if (position > out->stored.size()) {
       *error = blockWhere(*b) + ": section directory position lies outside the block";
       return false;
     }
-    b->text = payload.substr(0, position);
-    b->sections = payload.substr(position);
-    allowed_open = 1;  // the top tag's close is not part of any section
-  } else if (n >= kZxmlHeader.size() &&
-             std::memcmp(p, kZxmlHeader.data(), kZxmlHeader.size()) == 0) {
+    out->text_length = position;
+    out->allowed_open = 1;  // the top tag's close is not part of any section
+    return true;
+  }
+  if (n >= kZxmlHeader.size() && std::memcmp(p, kZxmlHeader.data(), kZxmlHeader.size()) == 0) {
     // Plain text padded with zeros.
     const void* nul = std::memchr(p, 0, n);
     size_t text_length = nul ? static_cast<size_t>(static_cast<const uint8_t*>(nul) - p) : n;
@@ -284,18 +246,40 @@ bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, std::
         return false;
       }
     }
-    b->text.assign(reinterpret_cast<const char*>(p), text_length);
-  } else {
-    *error = blockWhere(*b) + ": no \"ZXML\" block trailer";
+    if (!take(text_length)) return false;
+    out->text_length = text_length;
+    return true;
+  }
+  *error = blockWhere(*b) + ": no \"ZXML\" block trailer";
+  return false;
+}
+
+bool readTreeBlock(const uint8_t* p, size_t n, QaxBlock* b, QaxFile* file, InflateBudget& budget,
+                   bool keep_inflated, std::string* error) {
+  TreePayload payload;
+  if (!readTreePayload(p, n, b, file->little_endian, budget, &payload, error)) return false;
+  b->inflated_size = payload.stored.size();
+  std::string_view text = payload.stored.substr(0, payload.text_length);
+  // Paid before parsing, so that text of many short lines cannot grow into
+  // a tree past the budget; a kept copy of the text is paid for again.
+  uint64_t lines = static_cast<uint64_t>(std::count(text.begin(), text.end(), '\n'));
+  uint64_t kept = keep_inflated ? payload.stored.size() : 0;
+  std::string detail;
+  if (!budget.take(lines * kLineCost + kept, &detail)) {
+    *error = blockWhere(*b) + ": " + detail;
     return false;
   }
-  std::vector<std::string> ambiguities;
-  if (!parseZxmlText(b->text, &b->tree, &warnings, &detail, allowed_open, &ambiguities)) {
+  std::vector<std::string> warnings, ambiguities;
+  if (!parseZxmlText(text, &b->tree, &warnings, &detail, payload.allowed_open, &ambiguities)) {
     *error = blockWhere(*b) + " " + detail;
     return false;
   }
   addWarnings(*b, warnings, file->warnings);
   addWarnings(*b, ambiguities, file->ambiguities);
+  if (keep_inflated) {
+    b->text = std::string(text);
+    b->sections = std::string(payload.stored.substr(payload.text_length));
+  }
   return true;
 }
 
@@ -307,8 +291,10 @@ const QaxBlock* QaxFile::findBlock(std::string_view type) const {
   return nullptr;
 }
 
-bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* error) {
+bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* error,
+                   const QaxReadOptions& options) {
   *out = QaxFile();
+  InflateBudget budget(options.budget);
   out->size = size;
   if (size < kTrailerLength) {
     *error = "file of " + numberText(size) + " bytes is too short for the 14-byte trailer";
@@ -346,12 +332,20 @@ bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* 
   size_t dir_size = static_cast<size_t>(limit - out->directory_offset);
   std::string detail;
   if (out->directory_compressed) {
-    if (!inflateStream(dir, dir_size, &out->directory, &detail)) {
+    if (!inflateWithin(dir, dir_size, &out->directory, &budget, &detail)) {
       *error = "directory at offset " + numberText(out->directory_offset) + ": " + detail;
       return false;
     }
   } else {
     out->directory.assign(reinterpret_cast<const char*>(dir), dir_size);
+  }
+  // Each directory line becomes a key or a block, paid for as a tree line.
+  uint64_t directory_lines =
+      static_cast<uint64_t>(std::count(out->directory.begin(), out->directory.end(), '\n'));
+  uint64_t plain = out->directory_compressed ? 0 : dir_size;
+  if (!budget.take(plain + directory_lines * kLineCost, &detail)) {
+    *error = "directory at offset " + numberText(out->directory_offset) + ": " + detail;
+    return false;
   }
   if (!parseDirectory(out, error)) return false;
   uint64_t snapshots = 0;
@@ -360,13 +354,15 @@ bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* 
     size_t n = static_cast<size_t>(b.length);
     if (b.kind == QaxBlock::Kind::kRawData) {
       b.compressed = true;
-      if (!inflateStream(p, n, &b.data, &detail)) {
+      if (!inflateWithin(p, n, &b.data, &budget, &detail)) {
         *error = blockWhere(b) + ": " + detail;
         return false;
       }
+      b.inflated_size = b.data.size();
+      if (!options.keep_inflated) std::string().swap(b.data);
       continue;
     }
-    if (!readTreeBlock(p, n, &b, out, error)) return false;
+    if (!readTreeBlock(p, n, &b, out, budget, options.keep_inflated, error)) return false;
     if (b.tree.top()->name == "Snapshot") ++snapshots;
   }
   if (snapshots != out->snapshot_count)
@@ -375,7 +371,8 @@ bool parseQaxImage(const uint8_t* data, size_t size, QaxFile* out, std::string* 
   return true;
 }
 
-bool readQaxFile(const std::string& path, QaxFile* out, std::string* error) {
+bool readQaxFile(const std::string& path, QaxFile* out, std::string* error,
+                 const QaxReadOptions& options) {
   FILE* f = std::fopen(path.c_str(), "rb");
   if (!f) {
     *error = "cannot open: " + std::string(std::strerror(errno));
@@ -396,7 +393,8 @@ bool readQaxFile(const std::string& path, QaxFile* out, std::string* error) {
     *error = "read error";
     return false;
   }
-  return parseQaxImage(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size(), out, error);
+  return parseQaxImage(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size(), out, error,
+                       options);
 }
 
 }  // namespace cvn

@@ -69,9 +69,14 @@ std::string baseName(const char* path) {
   return slash && slash[1] ? slash + 1 : path;
 }
 
-bool readOrSay(const char* path, cvn::QaxFile* file) {
+// Only the plain dump shows the blocks as stored; the other views need the
+// trees alone, and a stored copy of each block's text would double what a
+// large result costs.
+bool readOrSay(const char* path, cvn::QaxFile* file, bool keep_inflated = false) {
   std::string error;
-  if (cvn::readQaxFile(path, file, &error)) return true;
+  cvn::QaxReadOptions options;
+  options.keep_inflated = keep_inflated;
+  if (cvn::readQaxFile(path, file, &error, options)) return true;
   std::fprintf(stderr, "qaxdump: %s: %s\n", path, error.c_str());
   return false;
 }
@@ -128,7 +133,7 @@ int main(int argc, char** argv) {
   if (!paths[0] || paths[1] || all) return usage();
   const char* path = paths[0];
   cvn::QaxFile file;
-  if (!readOrSay(path, &file)) return 1;
+  if (!readOrSay(path, &file, !mode)) return 1;
   if (!mode) {
     printDump(file);
   } else if (!std::strcmp(mode, "--json")) {

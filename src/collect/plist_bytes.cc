@@ -4,6 +4,7 @@
 #include <cstring>
 
 #include "collect/plist_leaves.h"
+#include "zxml/utf8_text.h"
 
 namespace cvn {
 namespace {
@@ -38,34 +39,11 @@ void appendEscapedCodePoint(std::string& out, uint32_t cp) {
   for (char b : bytes) appendEscapedByte(out, static_cast<unsigned char>(b));
 }
 
-bool isContinuation(unsigned char b) { return (b & 0xC0) == 0x80; }
-
 // Length of the UTF-8 sequence at p that expat accepts as one character, or
 // 0 when the bytes are not such a sequence.
 size_t sequenceLength(const unsigned char* p, size_t n, uint32_t* cp) {
-  unsigned char b = p[0];
-  size_t len;
-  unsigned char lo = 0x80, hi = 0xBF;
-  if (b >= 0xC2 && b <= 0xDF) {
-    len = 2;
-  } else if (b >= 0xE0 && b <= 0xEF) {
-    len = 3;
-    if (b == 0xE0) lo = 0xA0;
-    if (b == 0xED) hi = 0x9F;  // surrogates
-  } else if (b >= 0xF0 && b <= 0xF4) {
-    len = 4;
-    if (b == 0xF0) lo = 0x90;
-    if (b == 0xF4) hi = 0x8F;
-  } else {
-    return 0;
-  }
-  if (n < len || p[1] < lo || p[1] > hi) return 0;
-  for (size_t k = 2; k < len; ++k)
-    if (!isContinuation(p[k])) return 0;
-  uint32_t value = b & (len == 2 ? 0x1F : len == 3 ? 0x0F : 0x07);
-  for (size_t k = 1; k < len; ++k) value = (value << 6) | (p[k] & 0x3F);
-  if (value == 0xFFFE || value == 0xFFFF) return 0;  // not XML characters
-  *cp = value;
+  size_t len = utf8SequenceLength(p, n, cp);
+  if (len == 0 || *cp == 0xFFFE || *cp == 0xFFFF) return 0;  // not XML characters
   return len;
 }
 
@@ -406,12 +384,12 @@ bool restoreEscapedBytes(std::string& s) {
     if (b == 0xEF && r + 2 < s.size()) {
       unsigned char b1 = static_cast<unsigned char>(s[r + 1]);
       unsigned char b2 = static_cast<unsigned char>(s[r + 2]);
-      if (b1 >= 0x9C && b1 <= 0x9F && isContinuation(b2)) {
+      if (b1 >= 0x9C && b1 <= 0x9F && isUtf8Continuation(b2)) {
         s[w++] = static_cast<char>(((b1 & 0x03) << 6) | (b2 & 0x3F));
         r += 3;
         continue;
       }
-      if (b1 >= 0xA0 && b1 <= 0xA3 && isContinuation(b2)) clean = false;
+      if (b1 >= 0xA0 && b1 <= 0xA3 && isUtf8Continuation(b2)) clean = false;
     }
     s[w++] = s[r++];
   }

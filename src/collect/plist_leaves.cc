@@ -4,21 +4,13 @@
 #include <limits>
 #include <string>
 
+#include "zxml/text_case.h"
+
 namespace cvn {
 namespace {
 
 // Bytes that CoreFoundation skips as blanks around numbers.
 bool isNumberBlank(unsigned char c) { return c < 0x21 || (c >= 0x7F && c <= 0xA0); }
-
-bool equalsIgnoringCase(std::string_view a, std::string_view b) {
-  if (a.size() != b.size()) return false;
-  for (size_t i = 0; i < a.size(); ++i) {
-    char x = a[i];
-    if (x >= 'A' && x <= 'Z') x = static_cast<char>(x - 'A' + 'a');
-    if (x != b[i]) return false;
-  }
-  return true;
-}
 
 int64_t daysFromCivil(int64_t y, int64_t m, int64_t d) {
   y -= m <= 2;

@@ -5,8 +5,8 @@
 #include <unordered_map>
 
 #include "collect/command_runner.h"
-#include "zxml/size_text.h"
 #include "zxml/tag.h"
+#include "zxml/trim_text.h"
 
 namespace cvn {
 namespace {

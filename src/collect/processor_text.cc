@@ -1,5 +1,10 @@
 #include "collect/processor_text.h"
 
+#include <cmath>
+#include <cstdlib>
+
+#include "zxml/trim_text.h"
+
 namespace cvn {
 
 std::optional<int64_t> coreCountOfProcText(std::string_view text) {
@@ -24,6 +29,17 @@ std::optional<int64_t> coreCountOfProcText(std::string_view text) {
   }
   if (fields < 3 || fields > 4) return std::nullopt;
   return total;
+}
+
+int64_t megahertzOfSpeedText(std::string_view text) {
+  std::string number = firstWord(text);
+  for (char& c : number)
+    if (c == ',') c = '.';
+  double megahertz = std::strtod(number.c_str(), nullptr);
+  if (text.find("MHz") == std::string_view::npos) megahertz *= 1000;
+  // Rounded, not cut: 2.01 x 1000 is 2009.99... in binary floating point.
+  if (!(megahertz >= 0 && megahertz < 1e15)) return 0;
+  return std::llround(megahertz);
 }
 
 std::string processorMakerOf(std::string_view model) {

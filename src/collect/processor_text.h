@@ -14,6 +14,12 @@ namespace cvn {
 /// fourth field): the total core count T. Nothing for any other text.
 std::optional<int64_t> coreCountOfProcText(std::string_view text);
 
+/// A clock speed of the hardware overview in whole MHz, rounded to the
+/// nearest: "2.66 GHz", with a decimal comma in some locales ("2,01 GHz"),
+/// or "867 MHz" from very old profilers. The first word is the number; 0
+/// when it is none, or negative.
+int64_t megahertzOfSpeedText(std::string_view text);
+
 /// The maker of a processor by its name: "GenuineIntel" for an Intel name,
 /// "Apple Inc." for a chip whose name begins with "Apple", else empty.
 std::string processorMakerOf(std::string_view model);

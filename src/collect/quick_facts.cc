@@ -143,16 +143,7 @@ QuickFacts readQuickFacts(const PlistValue& root, const std::string& ioreg_uuid)
   if (std::optional<int64_t> cores = coreCountOfProcText(hardware.textAt("number_processors")))
     facts.processor_count = std::to_string(*cores);
   std::string speed = hardware.textAt("current_processor_speed");
-  if (!speed.empty()) {
-    std::string first = firstWord(speed);
-    // The profiler follows the locale: "2,3 GHz" has a decimal comma.
-    for (char& c : first)
-      if (c == ',') c = '.';
-    double number = std::atof(first.c_str());
-    // Old profilers print "2.26 GHz", very old ones "867 MHz".
-    facts.processor_speed =
-        wholeNumber(speed.find("MHz") != std::string::npos ? number : number * 1000);
-  }
+  if (!speed.empty()) facts.processor_speed = std::to_string(megahertzOfSpeedText(speed));
   facts.processor_model =
       hardware.find("cpu_type") ? hardware.textAt("cpu_type") : hardware.textAt("chip_type");
   facts.processor_maker = processorMakerOf(facts.processor_model);

@@ -3,6 +3,7 @@
 #include <functional>
 
 #include "sections/sections.h"
+#include "sections/written_volumes.h"
 
 namespace cvn {
 
@@ -11,15 +12,16 @@ void postProcess(TagTree& snapshot, const TagTree& raw, const SectionSources& so
   CommandRunner& runner = sources.runner;
   FileSystem& files = sources.files;
   std::FILE* out = log;
+  WrittenVolumes volumes;  // shared by the disks and the USB media
   const std::function<void()> steps[] = {
       [&] { buildSystemSection(snapshot, raw, sources.ioreg_uuid); },
       [&] { buildProcessorsSection(snapshot, raw); },
       [&] { buildMemorySection(snapshot, raw); },
       [&] { buildDisplaysSection(snapshot, raw); },
-      [&] { buildStorageSection(snapshot, raw); },
+      [&] { buildStorageSection(snapshot, raw, volumes); },
       [&] { buildNetworkAdaptersSection(snapshot, raw); },
       [&] { buildPrintersSection(snapshot, raw); },
-      [&] { buildUsbSection(snapshot, raw, runner); },
+      [&] { buildUsbSection(snapshot, raw, runner, volumes); },
       [&] { buildOperatingSystemSection(snapshot, raw); },
       [&] { buildUsersSection(snapshot, runner); },
       [&] { buildApplicationsSection(snapshot, raw); },

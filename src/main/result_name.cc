@@ -2,6 +2,8 @@
 
 #include <climits>
 
+#include "zxml/utf8_text.h"
+
 namespace cvn {
 namespace {
 
@@ -24,14 +26,7 @@ std::string safePart(const std::string& text, bool upper) {
 
 // Cuts before `limit`, backing off to the start of a UTF-8 sequence the
 // limit would split: macOS refuses names that are not UTF-8.
-void cutAt(std::string& text, size_t limit) {
-  if (text.size() <= limit) return;
-  size_t n = limit;
-  for (int back = 0; back < 3 && n > 0 && (static_cast<unsigned char>(text[n]) & 0xC0) == 0x80;
-       ++back)
-    --n;
-  text.resize(n);
-}
+void cutAt(std::string& text, size_t limit) { text.resize(utf8CutLength(text, limit)); }
 
 }  // namespace
 

@@ -4,7 +4,7 @@
 
 #include "sections/builder_util.h"
 #include "sections/sections.h"
-#include "zxml/size_text.h"
+#include "zxml/trim_text.h"
 
 namespace cvn {
 namespace {

@@ -50,20 +50,6 @@ bool hasAnyCacheKey(const Tag& item) {
   return false;
 }
 
-// "2.66 GHz" in MHz. A decimal comma is read like a point, as in size texts.
-// GHz x 1000 can land a hair below the whole number it stands for (2.01 x
-// 1000 is 2009.99...), so a result within a millionth of a whole number is
-// taken as that number before truncating.
-int64_t speedInMegahertz(std::string_view text) {
-  std::string number(firstWord(text));
-  for (char& c : number)
-    if (c == ',') c = '.';
-  double mhz = std::strtod(number.c_str(), nullptr) * 1000.0;
-  double nearest = std::round(mhz);
-  if (std::fabs(mhz - nearest) < 1e-6) mhz = nearest;
-  return truncateToInt64(mhz);
-}
-
 }  // namespace
 
 void buildProcessorsSection(TagTree& snapshot, const TagTree& raw) {
@@ -82,7 +68,7 @@ void buildProcessorsSection(TagTree& snapshot, const TagTree& raw) {
       cacheSizePerPackage(*item, "l3_cache", "l3_cache_core", "l3_cache_size", cores, packages);
   const TagValue* speed = rawValue(*item, "current_processor_speed");
   bool has_speed = speed && speed->isText();
-  int64_t megahertz = has_speed ? speedInMegahertz(speed->text()) : 0;
+  int64_t megahertz = has_speed ? megahertzOfSpeedText(speed->text()) : 0;
   const TagValue* cpu_type = rawValue(*item, "cpu_type");
   // Apple Silicon names its chip instead ("Apple M1 Pro") and reports no
   // caches, so a 0 there would be as false as a clock speed of 0.

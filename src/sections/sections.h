@@ -13,6 +13,7 @@ namespace cvn {
 
 class CommandRunner;
 class FileSystem;
+class WrittenVolumes;
 
 /// "System": computer system, chassis, memory slots, power management.
 /// `ioreg_uuid` stands in for a missing profiler UUID.
@@ -23,14 +24,16 @@ void buildProcessorsSection(TagTree& snapshot, const TagTree& raw);
 void buildMemorySection(TagTree& snapshot, const TagTree& raw);
 /// "Video": video adapters and monitors with EDID decoding.
 void buildDisplaysSection(TagTree& snapshot, const TagTree& raw);
-/// "Storage": physical disks, drives and volumes.
-void buildStorageSection(TagTree& snapshot, const TagTree& raw);
+/// "Storage": physical disks, drives and volumes; each volume written is
+/// added to `written`.
+void buildStorageSection(TagTree& snapshot, const TagTree& raw, WrittenVolumes& written);
 /// "Network"/"Adapters".
 void buildNetworkAdaptersSection(TagTree& snapshot, const TagTree& raw);
 /// "Peripherals": printers and scanners.
 void buildPrintersSection(TagTree& snapshot, const TagTree& raw);
-/// USB devices and removable media.
-void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner);
+/// USB devices and removable media; volumes in `written` are not written again.
+void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner,
+                     WrittenVolumes& written);
 /// "OS".
 void buildOperatingSystemSection(TagTree& snapshot, const TagTree& raw);
 /// "User-accounts", from `ls` and `dscl`.

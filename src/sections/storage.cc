@@ -1,12 +1,12 @@
 // "Storage": the disks and drives of the serial ATA, NVMe, parallel SCSI and
 // parallel ATA buses, the volumes of each disk, and the mounted volumes that
 // today's profilers list on their own.
-#include <set>
 #include <string>
 
 #include "sections/builder_util.h"
 #include "sections/sections.h"
 #include "sections/volume_fields.h"
+#include "sections/written_volumes.h"
 #include "zxml/size_text.h"
 
 namespace cvn {
@@ -39,7 +39,7 @@ bool isDiskImage(const Tag& volume) {
 // two SATA disks is the third disk.
 class StorageWriter {
  public:
-  explicit StorageWriter(Tag& top) : top_(top) {}
+  StorageWriter(Tag& top, WrittenVolumes& written) : top_(top), written_(written) {}
 
   void addDrive(const Tag& device) {
     Tag& drive = physicalDisks().addChild(formatText("CD:%d", ++drives_));
@@ -74,8 +74,8 @@ class StorageWriter {
     if (!hasKey(volume, "_name") || isDiskImage(volume)) return;
     std::string_view mount_point = rawText(volume, "mount_point");
     if (mount_point.empty() && !hasFreeSpace(volume)) return;
-    if (wasRecorded(volume)) return;
-    remember(volume);
+    if (written_.holds(volume)) return;
+    written_.add(volume);
     Tag& partition = logicalDisks().setChildValue(formatText("partition:%d", ++volumes_),
                                                   TagValue(rawText(volume, "_name")));
     writeFileSystem(partition, volume);
@@ -106,25 +106,9 @@ class StorageWriter {
     disk.setProperty("size", TagValue(truncateToInt64(gigabytes)), "base-value", base.c_str());
   }
 
-  // The same volume can be listed by its disk and again among the mounted
-  // volumes; its device name or mount point tells.
-  bool wasRecorded(const Tag& volume) const {
-    std::string_view bsd_name = rawText(volume, "bsd_name");
-    std::string_view mount_point = rawText(volume, "mount_point");
-    return (!bsd_name.empty() && bsd_names_.count(bsd_name)) ||
-           (!mount_point.empty() && mount_points_.count(mount_point));
-  }
-
-  void remember(const Tag& volume) {
-    std::string_view bsd_name = rawText(volume, "bsd_name");
-    std::string_view mount_point = rawText(volume, "mount_point");
-    if (!bsd_name.empty()) bsd_names_.insert(bsd_name);
-    if (!mount_point.empty()) mount_points_.insert(mount_point);
-  }
-
   bool addVolume(const Tag& volume) {
     if (!hasKey(volume, "_name")) return false;
-    remember(volume);
+    written_.add(volume);
     Tag& partition = logicalDisks().setChildValue(formatText("partition:%d", ++volumes_),
                                                   TagValue(rawText(volume, "_name")));
     if (rawText(volume, "iocontent") == "Apple_CoreStorage") {
@@ -138,12 +122,10 @@ class StorageWriter {
   }
 
   Tag& top_;
+  WrittenVolumes& written_;
   int disks_ = 0;
   int drives_ = 0;
   int volumes_ = 0;
-  // Views into the raw tree, which outlives the section's building.
-  std::set<std::string_view> bsd_names_;
-  std::set<std::string_view> mount_points_;
 };
 
 const Tag* childItems(const Tag& tag) { return tag.findChild("_items"); }
@@ -200,8 +182,8 @@ void addParallelAta(StorageWriter& writer, const TagTree& raw) {
 
 }  // namespace
 
-void buildStorageSection(TagTree& snapshot, const TagTree& raw) {
-  StorageWriter writer(snapshot.top());
+void buildStorageSection(TagTree& snapshot, const TagTree& raw, WrittenVolumes& written) {
+  StorageWriter writer(snapshot.top(), written);
   addControllerDisks(writer, raw, DiskBus::kSerialAta);
   addControllerDisks(writer, raw, DiskBus::kNvme);
   addParallelScsi(writer, raw);

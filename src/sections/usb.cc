@@ -14,7 +14,9 @@
 #include "sections/builder_util.h"
 #include "sections/sections.h"
 #include "sections/volume_fields.h"
+#include "sections/written_volumes.h"
 #include "zxml/size_text.h"
+#include "zxml/trim_text.h"
 
 namespace cvn {
 namespace {
@@ -104,7 +106,8 @@ std::optional<std::string> linkSpeedMegabits(std::string_view text) {
 
 class UsbWriter {
  public:
-  UsbWriter(Tag& top, CommandRunner& runner) : top_(top), runner_(runner) {}
+  UsbWriter(Tag& top, CommandRunner& runner, WrittenVolumes& written)
+      : top_(top), runner_(runner), written_(written) {}
 
   void addDevice(const Tag& device, int depth = 0) {
     const TagValue* removable = rawValue(device, "removable_media");
@@ -246,12 +249,13 @@ class UsbWriter {
   }
 
   // Volumes the profiler lists without free space (not mounted) are left out.
-  // One that the mounted volumes of the disk section already hold is counted
-  // but not written again.
+  // One already written (by the disk section, or under another device) is
+  // counted but not written again.
   bool addVolume(const Tag& volume) {
     if (!hasKey(volume, "_name") || !hasKey(volume, "free_space")) return false;
+    if (written_.holds(volume)) return true;
+    written_.add(volume);
     Tag& logical = top_.addChild("Storage").addChild("Logical-disks");
-    if (isMountedAlready(logical, rawText(volume, "mount_point"))) return true;
     Tag& partition = logical.setChildValue(logical.nextNumberedName("partition:"),
                                            TagValue(rawText(volume, "_name")));
     writeFileSystem(partition, volume);
@@ -262,24 +266,17 @@ class UsbWriter {
     return true;
   }
 
-  static bool isMountedAlready(const Tag& logical, std::string_view mount_point) {
-    if (mount_point.empty()) return false;
-    for (const auto& partition : logical.children()) {
-      const TagProperty* known = partition->findProperty("mount-point");
-      if (known && known->value().isText() && known->value().text() == mount_point) return true;
-    }
-    return false;
-  }
-
   Tag& top_;
   CommandRunner& runner_;
+  WrittenVolumes& written_;
   int devices_ = 0;
 };
 
 }  // namespace
 
-void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner) {
-  UsbWriter writer(snapshot.top(), runner);
+void buildUsbSection(TagTree& snapshot, const TagTree& raw, CommandRunner& runner,
+                     WrittenVolumes& written) {
+  UsbWriter writer(snapshot.top(), runner, written);
   bool any_device = false;
   if (const Tag* buses = findItems(raw, "SPUSBDataType")) {
     for (const auto& bus : buses->children()) {

@@ -5,7 +5,7 @@
 #include "collect/shell_quote.h"
 #include "sections/builder_util.h"
 #include "sections/sections.h"
-#include "zxml/size_text.h"
+#include "zxml/trim_text.h"
 
 namespace cvn {
 namespace {

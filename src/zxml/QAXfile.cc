@@ -4,7 +4,7 @@
 #include <ctime>
 
 #include "zxml/date_text.h"
-#include "zxml/size_text.h"
+#include "zxml/format_text.h"
 #include "zxml/tag.h"
 #include "zxml/zXML.h"
 
@@ -23,13 +23,13 @@ int countSnapshots(const std::vector<std::unique_ptr<SnapshotBlock>>& blocks) {
 
 }  // namespace
 
-void SnapshotFile::addTree(const TagTree& tree, SnapshotBlockType type, bool split,
-                           bool compressed) {
+void SnapshotFile::addTree(const TagTree& tree, SnapshotBlockType type, BlockLayout layout,
+                           BlockCompression compression) {
   auto block = std::make_unique<SnapshotBlock>();
   block->type = type;
-  block->compressed = compressed;
-  block->split = split;
-  block->data = tree.serialise(compressed, split);
+  block->compressed = compression == kCompressed;
+  block->split = layout == kSplitSections;
+  block->data = tree.serialise(compression, layout);
   const Tag& top = tree.top();
   block->top_name = top.name();
   const TagProperty* stamp = top.findProperty("timestamp");
@@ -148,25 +148,12 @@ std::vector<uint8_t> SnapshotFile::makeImage(bool compress_directory) {
   return image;
 }
 
-bool SnapshotFile::save(const std::string& file_name, bool compress_directory) {
-  return writeImageFile(file_name, makeImage(compress_directory));
-}
-
 std::string SnapshotFile::makeTimestamp(bool long_form) {
   return makeTimestamp(long_form, static_cast<int64_t>(std::time(nullptr)));
 }
 
 std::string SnapshotFile::makeTimestamp(bool long_form, int64_t now) {
   return formatLocalDate(now, long_form);
-}
-
-bool writeImageFile(const std::string& file_name, const std::vector<uint8_t>& image) {
-  FILE* file = std::fopen(file_name.c_str(), "w");
-  if (!file) return false;
-  bool written = std::fwrite(image.data(), 1, image.size(), file) == image.size();
-  written = std::fflush(file) == 0 && written;
-  written = std::fclose(file) == 0 && written;
-  return written;
 }
 
 }  // namespace cvn

@@ -9,9 +9,9 @@
 #include <string>
 #include <vector>
 
-namespace cvn {
+#include "zxml/tag.h"
 
-class TagTree;
+namespace cvn {
 
 enum SnapshotBlockType : int { kAssetInfoBlock = 0, kSnapshotBlock = 1, kCustomDataBlock = 2 };
 
@@ -30,7 +30,7 @@ struct SnapshotBlock {
   uint64_t length() const { return data.size(); }
 };
 
-/// SnapshotFile::save's flag for a deflated directory.
+/// SnapshotFile::makeImage's flag for a deflated directory.
 inline constexpr bool kCompressedDirectory = true;
 
 class SnapshotFile {
@@ -40,12 +40,13 @@ class SnapshotFile {
   explicit SnapshotFile(bool little_endian) : little_endian_(little_endian) {}
 
   /// Serialises `tree` now and appends it as a block of `type`.
-  void addTree(const TagTree& tree, SnapshotBlockType type, bool split, bool compressed);
+  void addTree(const TagTree& tree, SnapshotBlockType type, BlockLayout layout,
+               BlockCompression compression);
   /// Compresses `bytes` into a custom-data block (a bare zlib stream).
   void addRawData(const uint8_t* bytes, size_t length);
-  /// Writes the file in one piece; false if it cannot be created or written.
-  bool save(const std::string& file_name, bool compress_directory);
-  /// The bytes save() writes.
+  /// The whole file: the blocks, the directory and the trailer. Saving it is
+  /// the result directory's work (main/result_directory), which never
+  /// leaves a partial file or writes through a link.
   std::vector<uint8_t> makeImage(bool compress_directory);
 
   /// Now, local time: "yyyyMMddHHmmss.000000" and the zone in minutes
@@ -65,10 +66,6 @@ class SnapshotFile {
   bool has_raw_data_ = false;
   std::vector<std::unique_ptr<SnapshotBlock>> blocks_;
 };
-
-/// Writes `image` as the whole file `file_name`; false when it cannot be
-/// created or written.
-bool writeImageFile(const std::string& file_name, const std::vector<uint8_t>& image);
 
 }  // namespace cvn
 

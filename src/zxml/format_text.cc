@@ -22,4 +22,12 @@ std::string formatText(const char* format, ...) {
   return out;
 }
 
+size_t measureFormat(const char* format, ...) {
+  va_list args;
+  va_start(args, format);
+  int n = std::vsnprintf(nullptr, 0, format, args);
+  va_end(args);
+  return n < 0 ? 0 : static_cast<size_t>(n);
+}
+
 }  // namespace cvn

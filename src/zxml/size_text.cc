@@ -1,10 +1,8 @@
 #include "zxml/size_text.h"
 
-#include <cctype>
 #include <cmath>
-#include <cstdarg>
 #include <cstdio>
-#include <cstdlib>
+#include <string>
 
 namespace cvn {
 namespace {
@@ -65,38 +63,6 @@ double SizeText::toDecimalGigabytes(std::string_view text, bool round) {
   double whole = static_cast<double>(static_cast<int64_t>(gigabytes));
   if (gigabytes - whole > 0.4) whole += 1.0;
   return whole;
-}
-
-std::string trimText(std::string_view text, std::string_view set, int mode) {
-  if (mode & kTrimLeft) {
-    while (!text.empty() && set.find(text.front()) != std::string_view::npos) text.remove_prefix(1);
-  }
-  if (mode & kTrimRight) {
-    while (!text.empty() && set.find(text.back()) != std::string_view::npos) text.remove_suffix(1);
-  }
-  return std::string(text);
-}
-
-std::string firstWord(std::string_view text) {
-  return trimText(text.substr(0, text.find(' ')), " \n\r", kTrimBoth);
-}
-
-bool equalsIgnoringCase(std::string_view a, std::string_view b) {
-  if (a.size() != b.size()) return false;
-  for (size_t i = 0; i < a.size(); ++i) {
-    if (std::tolower(static_cast<unsigned char>(a[i])) !=
-        std::tolower(static_cast<unsigned char>(b[i])))
-      return false;
-  }
-  return true;
-}
-
-size_t measureFormat(const char* format, ...) {
-  va_list args;
-  va_start(args, format);
-  int n = std::vsnprintf(nullptr, 0, format, args);
-  va_end(args);
-  return n < 0 ? 0 : static_cast<size_t>(n);
 }
 
 }  // namespace cvn

@@ -1,11 +1,9 @@
-// Value helpers shared by the section builders and the serialisers: size
-// texts such as "4 GB" or "250,06 GB", trimming, first words.
+// Size texts of the profiler such as "4 GB" or "250,06 GB", read as numbers
+// of a fixed unit.
 #ifndef CVN_ZXML_SIZE_TEXT_H_
 #define CVN_ZXML_SIZE_TEXT_H_
 
-#include <cstddef>
 #include <cstdint>
-#include <string>
 #include <string_view>
 
 namespace cvn {
@@ -24,17 +22,6 @@ struct SizeText {
   /// fraction is above 0.4.
   static double toDecimalGigabytes(std::string_view text, bool round);
 };
-
-enum TrimMode : int { kTrimLeft = 1, kTrimRight = 2, kTrimBoth = 3 };
-
-/// Removes characters of `set` from the left (mode bit 1) and/or the right
-/// (mode bit 2).
-std::string trimText(std::string_view text, std::string_view set, int mode);
-/// The part before the first blank, trimmed of " \n\r" on both ends.
-std::string firstWord(std::string_view text);
-bool equalsIgnoringCase(std::string_view a, std::string_view b);
-/// The number of bytes the printf-formatted text would take.
-size_t measureFormat(const char* format, ...) __attribute__((format(printf, 1, 2)));
 
 }  // namespace cvn
 

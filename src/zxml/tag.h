@@ -254,22 +254,29 @@ class Tag {
   Kind kind_;
 };
 
-/// Names for the flags of dumpText, serialise and SnapshotFile::addTree, so
-/// that calls read as what they ask for.
-inline constexpr bool kCloseTags = false;
-inline constexpr bool kLeaveTagsOpen = true;
-inline constexpr bool kWithChildren = false;
-inline constexpr bool kWithoutChildren = true;
-inline constexpr bool kWholeText = false;
-inline constexpr bool kSplitSections = true;
-inline constexpr bool kCompressed = true;
-inline constexpr bool kUncompressed = false;
+/// The flags of dumpText, serialise and SnapshotFile::addTree, each a type of
+/// its own so that two flags passed in the wrong order do not compile, with
+/// short names so that calls read as what they ask for.
+enum class DumpClose { kCloseTags, kLeaveTagsOpen };
+enum class DumpChildren { kWithChildren, kWithoutChildren };
+enum class BlockLayout { kWholeText, kSplitSections };
+enum class BlockCompression { kUncompressed, kCompressed };
+inline constexpr DumpClose kCloseTags = DumpClose::kCloseTags;
+inline constexpr DumpClose kLeaveTagsOpen = DumpClose::kLeaveTagsOpen;
+inline constexpr DumpChildren kWithChildren = DumpChildren::kWithChildren;
+inline constexpr DumpChildren kWithoutChildren = DumpChildren::kWithoutChildren;
+inline constexpr BlockLayout kWholeText = BlockLayout::kWholeText;
+inline constexpr BlockLayout kSplitSections = BlockLayout::kSplitSections;
+inline constexpr BlockCompression kUncompressed = BlockCompression::kUncompressed;
+inline constexpr BlockCompression kCompressed = BlockCompression::kCompressed;
 
 /// An unnamed document tag whose first child is the top tag ("Macintosh",
 /// "Snapshot", "AssetInfo"). Serialising lives in zxml/zXML.
 class TagTree {
  public:
-  /// `native_byte_order` selects the byte order of the split-mode trailer.
+  /// `native_byte_order` selects the byte order of the split-mode trailer:
+  /// little-endian, the target's own, or else big-endian, as the container's
+  /// trailer (zxml/QAXfile) does.
   TagTree(bool native_byte_order, std::string_view top_name);
   TagTree(const TagTree& other);
   TagTree& operator=(const TagTree&) = delete;
@@ -290,10 +297,10 @@ class TagTree {
   /// Writes the ZXML text at `buffer + offset` (which must hold textSize()
   /// bytes) and returns the bytes written. The flags apply to the document's
   /// direct children only.
-  size_t dumpText(char* buffer, size_t offset, bool no_close, bool no_children) const;
+  size_t dumpText(char* buffer, size_t offset, DumpClose close, DumpChildren children) const;
   /// The whole tree as a block: ZXML text, optionally split into sections and
   /// compressed, with the trailer. The caller owns the bytes.
-  std::vector<uint8_t> serialise(bool compressed, bool split) const;
+  std::vector<uint8_t> serialise(BlockCompression compression, BlockLayout layout) const;
 
  private:
   bool native_byte_order_;

@@ -9,9 +9,12 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <memory>
+#include <new>
 #include <string>
 
 #include "zxml/tag.h"
+#include "zxml/utf8_text.h"
 
 namespace cvn {
 
@@ -34,9 +37,7 @@ size_t keptLength(std::string_view text) {
   size_t n = std::min(text.size(), kMaxZxmlText);
   if (const void* nul = std::memchr(text.data(), '\0', n))
     return static_cast<size_t>(static_cast<const char*>(nul) - text.data());
-  if (n == text.size()) return n;
-  for (int back = 0; back < 3 && (static_cast<unsigned char>(text[n]) & 0xC0) == 0x80; ++back) --n;
-  return n;
+  return utf8CutLength(text, n);
 }
 
 inline bool opensMarkup(char c) { return c == '+' || c == '*' || c == '-' || c == '~'; }
@@ -92,6 +93,9 @@ __attribute__((noinline)) size_t writeEscapedText(char* out, std::string_view te
         out[i] = ' ';
     }
   }
+  // A property's name begins its line: led by a mark, it would read as a
+  // tag, an annotation or a close.
+  if (opensMarkup(out[0])) out[0] = '_';
   return size;
 }
 
@@ -110,6 +114,7 @@ inline size_t writeText(char* out, std::string_view text, ZxmlField field) {
   if (size > kShortText) return writeEscapedText(out, text, field);
   const bool name = field == ZxmlField::kName;
   const char* bytes = text.data();
+  if (name && size && opensMarkup(bytes[0])) return writeEscapedText(out, text, field);
   size_t i = 0;
   for (; i + 8 <= size; i += 8) {
     uint64_t word;
@@ -173,7 +178,7 @@ char* writeAnnotations(char* out, const TagList<Annotation>& annotations) {
 
 // Writes the tag's lines; the flags affect this tag only, never its
 // descendants.
-char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
+char* writeTag(char* out, const Tag& tag, DumpClose close, DumpChildren children) {
   bool branch = tag.kind() == Tag::Kind::kBranch;
   *out++ = branch ? '+' : '*';
   out = writeName(out, tag.name());
@@ -189,9 +194,9 @@ char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
     out = writeAnnotations(out, p->annotations());
   }
   if (!branch) return out;
-  if (!no_children)
+  if (children == kWithChildren)
     for (const auto& c : tag.children()) out = writeTag(out, *c, kCloseTags, kWithChildren);
-  if (!no_close) {
+  if (close == kCloseTags) {
     *out++ = '-';
     *out++ = '\n';
   }
@@ -200,21 +205,19 @@ char* writeTag(char* out, const Tag& tag, bool no_close, bool no_children) {
 
 // Kept out of line: inlined into the callers, g++ loses track of the buffer
 // size and warns about the final NUL.
-__attribute__((noinline)) size_t writeDocument(const Tag& document, char* start, bool no_close,
-                                               bool no_children) {
+__attribute__((noinline)) size_t writeDocument(const Tag& document, char* start, DumpClose close,
+                                               DumpChildren children) {
   char* out = start;
   std::memcpy(out, kHeader, kHeaderLength);
   out += kHeaderLength;
-  for (const auto& c : document.children()) out = writeTag(out, *c, no_close, no_children);
+  for (const auto& c : document.children()) out = writeTag(out, *c, close, children);
   *out = '\0';
   return static_cast<size_t>(out - start);
 }
 
-void appendUint32(std::vector<uint8_t>& out, uint32_t value, bool native) {
-  if (!native) value = __builtin_bswap32(value);
-  uint8_t bytes[4];
-  std::memcpy(bytes, &value, 4);
-  out.insert(out.end(), bytes, bytes + 4);
+void appendUint32(std::vector<uint8_t>& out, uint32_t value, bool little_endian) {
+  for (int i = 0; i < 4; ++i)
+    out.push_back(static_cast<uint8_t>(value >> 8 * (little_endian ? i : 3 - i)));
 }
 
 // Sections of a split block: the top level alone, then each child of the top
@@ -268,14 +271,18 @@ std::vector<uint8_t> compressLevel9(const uint8_t* data, size_t size, const char
   std::vector<uint8_t> out;
   z_stream strm;
   std::memset(&strm, 0, sizeof strm);
-  if (deflateInit(&strm, Z_BEST_COMPRESSION) != Z_OK) return out;
+  // An empty stream would be saved as an inventory that holds nothing.
+  int ret = deflateInit(&strm, Z_BEST_COMPRESSION);
+  if (ret == Z_MEM_ERROR) throw std::bad_alloc();
+  CVN_CHECK(module, ret == Z_OK);
+  // Ends the stream however this returns, a std::bad_alloc below included.
+  std::unique_ptr<z_stream, int (*)(z_stream*)> stream_end(&strm, deflateEnd);
   // The bound zlib guarantees for level 9 with the default window: tiny or
   // incompressible input grows, and one spare output area keeps the loop
   // below from reallocating.
   out.reserve(size + (size >> 12) + (size >> 14) + (size >> 25) + 13 + kChunk + spare);
   size_t used = 0;
   size_t remaining = size;
-  int ret = Z_OK;
   for (;;) {
     bool last = remaining <= kChunk;
     size_t chunk = last ? remaining : kChunk;
@@ -296,7 +303,6 @@ std::vector<uint8_t> compressLevel9(const uint8_t* data, size_t size, const char
     if (last) break;
   }
   CVN_CHECK(module, ret == Z_STREAM_END);
-  deflateEnd(&strm);
   out.resize(used);
   return out;
 }
@@ -307,12 +313,14 @@ size_t TagTree::textSize() const {
   return size + kSlack;
 }
 
-size_t TagTree::dumpText(char* buffer, size_t offset, bool no_close, bool no_children) const {
-  return writeDocument(document(), buffer + offset, no_close, no_children);
+size_t TagTree::dumpText(char* buffer, size_t offset, DumpClose close,
+                         DumpChildren children) const {
+  return writeDocument(document(), buffer + offset, close, children);
 }
 
-std::vector<uint8_t> TagTree::serialise(bool compressed, bool split) const {
-  if (split) return serialiseSplit(*this, compressed);
+std::vector<uint8_t> TagTree::serialise(BlockCompression compression, BlockLayout layout) const {
+  const bool compressed = compression == kCompressed;
+  if (layout == kSplitSections) return serialiseSplit(*this, compressed);
   size_t size = textSize();
   if (!compressed) {
     // The text padded with zeros to the estimated size; the zeros stand in

@@ -32,10 +32,11 @@ enum class ZxmlField { kName, kValue };
 
 /// Writes `text` as the dump stores it in `field`, so that no collected text
 /// can open, close or hide a line of markup: the text ends at its first NUL
-/// byte and after kMaxZxmlText bytes; in a name "=" becomes "_" and a line
-/// break a blank; in a value a line break stays only when the line it starts
-/// cannot be read as markup (it begins with none of "+", "*", "-", "~" and
-/// holds no "="), otherwise it becomes a blank. Writes at most
+/// byte and after kMaxZxmlText bytes; in a name "=" becomes "_", a line
+/// break a blank, and a leading "+", "*", "-" or "~" an "_" (a property's
+/// name begins its line); in a value a line break stays only when the line
+/// it starts cannot be read as markup (it begins with none of "+", "*", "-",
+/// "~" and holds no "="), otherwise it becomes a blank. Writes at most
 /// min(text.size(), kMaxZxmlText) bytes at `out` and returns the count.
 size_t writeZxmlText(char* out, std::string_view text, ZxmlField field);
 /// The same as a string: exactly what a reader of the block gets back.
