@@ -24,10 +24,10 @@ namespace {
 class ToolsPrint : public cvn::FakeCommandRunner {
  public:
   explicit ToolsPrint(std::string text) : text_(std::move(text)) {}
-  std::string run(const std::string& command, size_t) override {
+  cvn::ToolOutput respond(const std::string& command) override {
     // One user, so the users section asks dscl once and never loops on an
     // empty listing.
-    return command == "ls -1 /Users/" ? std::string("jane\n") : text_;
+    return {command == "ls -1 /Users/" ? std::string("jane\n") : text_, false};
   }
 
  private:
