@@ -7,14 +7,15 @@
 #include <unistd.h>
 
 #include <chrono>
+#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <sstream>
 #include <string>
 #include <thread>
 
 #include "collect/process_group_runner.h"
+#include "corpus_files.h"
 #include "fake_command_runner.h"
 #include "qax_reader.h"
 #include "sections/sections.h"
@@ -34,17 +35,15 @@ int liveMembersOf(pid_t group) {
   for (int attempt = 0; attempt < 100; ++attempt) {
     live = 0;
     for (const auto& entry : std::filesystem::directory_iterator("/proc")) {
-      const std::string name = entry.path().filename().string();
-      if (name.find_first_not_of("0123456789") != std::string::npos) continue;
-      std::ifstream in(entry.path() / "stat");
-      std::string stat((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+      const std::string stat = readWholeFile(entry.path() / "stat");
       size_t close = stat.rfind(')');
-      if (close == std::string::npos) continue;
-      std::istringstream fields(stat.substr(close + 2));
       char state = 0;
       long parent = 0, process_group = 0;
-      fields >> state >> parent >> process_group;
-      if (process_group == group && state != 'Z') ++live;
+      if (close != std::string::npos &&
+          std::sscanf(stat.c_str() + close + 1, " %c %ld %ld", &state, &parent, &process_group) ==
+              3 &&
+          process_group == group && state != 'Z')
+        ++live;
     }
     if (live == 0) break;
     std::this_thread::sleep_for(milliseconds(20));
@@ -170,10 +169,7 @@ class HungProfilerTest : public ::testing::Test {
     }
     return -1;
   }
-  std::string out() {
-    std::ifstream in(root_ + "/out");
-    return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
-  }
+  std::string out() { return readWholeFile(root_ + "/out"); }
 
   std::string root_;
 };
