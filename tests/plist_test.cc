@@ -77,6 +77,7 @@ TEST(PlistTest, ValueKinds) {
                {"<string>a<b/>c</string>", ""},
                {"<string> &lt;&amp;&apos;&quot;&#65;&#xE9;</string>", "s\" <&'\"A\\xC3\\xA9\""},
                {"<string><![CDATA[<b>&amp;]]>]]></string>", "s\"<b>&amp;]]>\""},
+               {"<string><![CDATA[\r]]></string>", "s\"\\x0D\""},
                // CR, raw control bytes (as profilers print part numbers) and bytes
                // that are not UTF-8 are kept as they are, and so is our own escape
                // range.
