@@ -31,7 +31,8 @@ TEST(ProcessCollectorTest, OneListingGivesWhatItHolds) {
        "process started after the table and the kernel left out",
        "    0 root           kernel\n    7 _mdnsresponder   /usr/sbin/mDNSResponder -launchd\n"
        "   12 jos\xC3\xA9           /bin/sh -c echo one\n\n  two  \n 4000 jane           ps\n",
-       "_mdnsresponder|/usr/sbin/mDNSResponder -launchd", "jos\xC3\xA9|/bin/sh -c echo one\n\n  two"},
+       "_mdnsresponder|/usr/sbin/mDNSResponder -launchd",
+       "jos\xC3\xA9|/bin/sh -c echo one\n\n  two"},
       {"procps: names cut to eight, a header and a blank line",
        "  PID USER     COMMAND\n\n    7 averyve+ [kworker/0:1]\n   12 root     \n",
        "averyve+|[kworker/0:1]", "root|"},
