@@ -20,9 +20,10 @@ class FixedProcessTable : public ProcessTable {
  public:
   bool read(std::vector<ProcessEntry>* out) override {
     *out = entries;
-    return true;
+    return readable;
   }
   std::vector<ProcessEntry> entries;
+  bool readable = true;
 };
 
 class SteppingClock : public Clock {

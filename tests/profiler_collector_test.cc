@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <string>
@@ -36,56 +37,59 @@ std::string output(const std::string& type) {
   return std::string(kProfilerHeader) + body(type) + std::string(kProfilerFooter);
 }
 
+// What the collector splices from output(type) of every type but `left_out`.
+std::string splicedWithout(const std::vector<std::string>& left_out) {
+  std::string document(kProfilerHeader);
+  for (const char* type : kTypes) {
+    if (std::find(left_out.begin(), left_out.end(), type) == left_out.end()) document += body(type);
+  }
+  return document + std::string(kProfilerFooter);
+}
+
 TEST(ProfilerCollectorTest, SplicesEveryTypeInOrderWithOneHeaderAndFooter) {
   FakeCommandRunner runner;
   runner.setLimits(ToolLimits::forProfilerSeconds(90));
-  std::string expected(kProfilerHeader);
-  for (const char* type : kTypes) {
-    runner.answer(command(type), output(type));
-    expected += body(type);
-  }
-  expected += kProfilerFooter;
+  for (const char* type : kTypes) runner.answer(command(type), output(type));
+  // Outputs too short to cut drop out, but the header and footer stay.
+  const std::vector<std::string> short_ones = {"SPHardwareDataType", "SPAudioDataType",
+                                               "SPPowerDataType"};
+  for (const std::string& type : short_ones) runner.answer(command(type), std::string(17, 'x'));
   std::FILE* out = tmpfile();
   std::string document = ProfilerCollector(runner).collect(false, out);
-  EXPECT_EQ(document, expected);
+  EXPECT_EQ(document, splicedWithout(short_ones));
   EXPECT_EQ(std::ftell(out), 0) << "nothing is printed without the progress flag";
   std::fclose(out);
   // The slowest types start first.
   ASSERT_EQ(runner.commands_ran_.size(), 21u);
-  EXPECT_EQ(runner.commands_ran_[0], command("SPApplicationsDataType"));
-  EXPECT_EQ(runner.commands_ran_[1], command("SPAirPortDataType"));
-  EXPECT_EQ(runner.commands_ran_[2], command("SPDiscBurningDataType"));
-  EXPECT_EQ(runner.commands_ran_[3], command("SPHardwareDataType"));
+  EXPECT_EQ(
+      std::vector<std::string>(runner.commands_ran_.begin(), runner.commands_ran_.begin() + 4),
+      (std::vector<std::string>{command("SPApplicationsDataType"), command("SPAirPortDataType"),
+                                command("SPDiscBurningDataType"), command("SPHardwareDataType")}));
   EXPECT_EQ(runner.most_at_once_, 6u);
-  for (size_t i = 0; i < 21; ++i) {
-    EXPECT_EQ(runner.chunk_sizes_[i], 65536u);
-    EXPECT_EQ(runner.limits_given_[i], std::chrono::seconds(90));
-  }
-}
-
-TEST(ProfilerCollectorTest, ShortOutputsDropOutButHeaderAndFooterStay) {
-  FakeCommandRunner runner;
-  for (const char* type : kTypes) runner.answer(command(type), output(type));
-  // 17 bytes is too short for the first cut, 189 for the middle, 171 for the last.
-  runner.answer(command("SPHardwareDataType"), std::string(17, 'x'));
-  runner.answer(command("SPAudioDataType"), std::string(189, 'x'));
-  runner.answer(command("SPPowerDataType"), std::string(171, 'x'));
-  std::string document = ProfilerCollector(runner).collect(false, nullptr);
-  EXPECT_EQ(document.compare(0, kProfilerHeader.size(), kProfilerHeader), 0);
-  EXPECT_EQ(document.substr(document.size() - kProfilerFooter.size()), kProfilerFooter);
-  EXPECT_EQ(document.find("SPAudioDataType"), std::string::npos);
-  EXPECT_EQ(document.find("SPHardwareDataType"), std::string::npos);
-  EXPECT_LT(document.find("SPBluetoothDataType"), document.find("SPDisplaysDataType"));
+  EXPECT_EQ(runner.chunk_sizes_, std::vector<size_t>(21, 65536));
+  EXPECT_EQ(runner.limits_given_, std::vector<ToolDuration>(21, std::chrono::seconds(90)));
 }
 
 TEST(ProfilerCollectorTest, TrimModesCutByByteCount) {
   using Trim = ProfilerCollector::Trim;
-  EXPECT_EQ(trimProfilerOutput(output("A"), Trim::kFirst),
-            std::string(kProfilerHeader) + body("A"));
-  EXPECT_EQ(trimProfilerOutput(output("A"), Trim::kMiddle), body("A"));
-  EXPECT_EQ(trimProfilerOutput(output("A"), Trim::kLast), body("A") + std::string(kProfilerFooter));
-  EXPECT_EQ(trimProfilerOutput(std::string(190, 'x'), Trim::kMiddle), "");
-  EXPECT_EQ(trimProfilerOutput(std::string(191, 'x'), Trim::kMiddle), "x");
+  const struct {
+    std::string output;
+    Trim trim;
+    std::string expected;
+  } cases[] = {
+      {output("A"), Trim::kFirst, std::string(kProfilerHeader) + body("A")},
+      {output("A"), Trim::kMiddle, body("A")},
+      {output("A"), Trim::kLast, body("A") + std::string(kProfilerFooter)},
+      // One byte more than the footer, the header or both is kept.
+      {std::string(18, 'x'), Trim::kFirst, ""},
+      {std::string(19, 'x'), Trim::kFirst, "x"},
+      {std::string(190, 'x'), Trim::kMiddle, ""},
+      {std::string(191, 'x'), Trim::kMiddle, "x"},
+      {std::string(172, 'x'), Trim::kLast, ""},
+      {std::string(173, 'x'), Trim::kLast, "x"},
+  };
+  for (const auto& c : cases)
+    EXPECT_EQ(trimProfilerOutput(c.output, c.trim), c.expected) << c.output.size();
 }
 
 // Everything one collection gives, to compare two ways of running it.
@@ -112,15 +116,11 @@ Collected collectWith(FakeCommandRunner& runner, size_t side_by_side) {
 TEST(ProfilerCollectorTest, SideBySideGivesWhatOneAtATimeGivesForBothSampleMacs) {
   for (const char* mac : {"sample_mac", "modern_mac"}) {
     auto prepare = [&](FakeCommandRunner& runner) {
-      for (const char* type : kTypes) {
-        std::string path =
-            std::string(CVN_SOURCE_DIR "/tests/") + mac + "/profiler/" + type + ".xml";
-        runner.answer(command(type), readWholeFile(path));
-      }
-      for (const char* type : {"SPNVMeDataType", "SPStorageDataType", "SPUSBHostDataType"}) {
-        std::string path =
-            std::string(CVN_SOURCE_DIR "/tests/") + mac + "/profiler/" + type + ".xml";
-        runner.answer(command(type), readWholeFile(path));
+      std::vector<std::string> types(std::begin(kTypes), std::end(kTypes));
+      types.insert(types.end(), {"SPNVMeDataType", "SPStorageDataType", "SPUSBHostDataType"});
+      for (const std::string& type : types) {
+        runner.answer(command(type), readWholeFile(std::string(CVN_SOURCE_DIR "/tests/") + mac +
+                                                   "/profiler/" + type + ".xml"));
       }
       // Prints nothing twice before it answers: asked again at once each time.
       runner.answerInTurn(command("SPBluetoothDataType"), {ToolOutput{}, ToolOutput{}});
@@ -154,14 +154,8 @@ TEST(ProfilerCollectorTest, ARunThatHitItsLimitIsLeftOutNamedAndNeverAskedAgain)
        {"SPHardwareDataType", "SPBluetoothDataType", "SPPowerDataType", "SPStorageDataType"})
     runner.hang(command(type), output(type));
   Collected c = collectWith(runner, 6);
-  std::string expected(kProfilerHeader);
-  for (const char* type : kTypes) {
-    if (std::string(type) != "SPHardwareDataType" && std::string(type) != "SPBluetoothDataType" &&
-        std::string(type) != "SPPowerDataType")
-      expected += body(type);
-  }
-  expected += kProfilerFooter;
-  EXPECT_EQ(c.document, expected);
+  EXPECT_EQ(c.document,
+            splicedWithout({"SPHardwareDataType", "SPBluetoothDataType", "SPPowerDataType"}));
   EXPECT_EQ(c.extra_documents, std::vector<std::string>{output("SPNVMeDataType")})
       << "SPStorageDataType hung, and SPUSBHostDataType printed nothing: asked once each";
   EXPECT_EQ(c.progress,
@@ -204,22 +198,14 @@ TEST(CollectedDocumentTest, AMalformedPieceCostsOnlyItself) {
   std::string document = ProfilerCollector(runner).collect(false, nullptr, &part_ends);
   ASSERT_EQ(part_ends.size(), 21u);
   EXPECT_EQ(part_ends.back(), document.size());
-
   Plist root;
   ASSERT_TRUE(parseCollectedDocument(document, part_ends, &root));
-  std::vector<std::string> types = dataTypes(root);
-  ASSERT_EQ(types.size(), 21u);
-  EXPECT_EQ(types.front(), "SPHardwareDataType");
-  EXPECT_EQ(types[3], "SPParallelATADataType");
-  EXPECT_EQ(types[4], "(none)") << "audio keeps only what came before its break";
-  EXPECT_EQ(types[5], "SPBluetoothDataType");
-  EXPECT_EQ(types.back(), "SPPowerDataType");
-}
-
-TEST(CollectedDocumentTest, AWellFormedDocumentIsReadWhole) {
-  std::string document =
+  std::vector<std::string> expected(std::begin(kTypes), std::end(kTypes));
+  expected[4] = "(none)";  // audio keeps only what came before its break
+  EXPECT_EQ(dataTypes(root), expected);
+  // A well-formed document is read whole, whatever the parts.
+  document =
       std::string(kProfilerHeader) + typeDict("A") + typeDict("B") + std::string(kProfilerFooter);
-  Plist root;
   ASSERT_TRUE(parseCollectedDocument(document, {10, document.size()}, &root));
   EXPECT_EQ(dataTypes(root), (std::vector<std::string>{"A", "B"}));
   EXPECT_FALSE(parseCollectedDocument("no xml here", {5, 11}, &root));
@@ -229,42 +215,37 @@ TEST(ExtraTypesTest, OnlyTheAskedTypesJoinTheListAndEachOnce) {
   auto document = [](const std::string& dicts) {
     return std::string(kProfilerHeader) + dicts + std::string(kProfilerFooter);
   };
+  const std::string nvme = typeDict("SPNVMeDataType"), hardware = typeDict("SPHardwareDataType");
   const struct {
     const char* what;
-    std::vector<std::string> root_types;  // empty: the main document was unreadable
+    std::string main;  // empty: the main document was unreadable
     std::vector<std::string> documents;
-    std::vector<std::string> expected;
+    std::string expected;
   } cases[] = {
       {"appended after the main types",
-       {"SPHardwareDataType"},
-       {document(typeDict("SPNVMeDataType")), document(typeDict("SPStorageDataType"))},
-       {"SPHardwareDataType", "SPNVMeDataType", "SPStorageDataType"}},
+       hardware,
+       {document(nvme), document(typeDict("SPStorageDataType"))},
+       "SPHardwareDataType SPNVMeDataType SPStorageDataType"},
       {"a type nobody asked for stays out",
-       {"SPHardwareDataType"},
-       {document(typeDict("SPHardwareDataType") + typeDict("SPUSBHostDataType"))},
-       {"SPHardwareDataType", "SPUSBHostDataType"}},
-      {"a type already there is not added twice",
-       {"SPNVMeDataType"},
-       {document(typeDict("SPNVMeDataType"))},
-       {"SPNVMeDataType"}},
+       hardware,
+       {document(hardware + typeDict("SPUSBHostDataType"))},
+       "SPHardwareDataType SPUSBHostDataType"},
+      {"a type already there is not added twice", nvme, {document(nvme)}, "SPNVMeDataType"},
       {"no XML and broken XML are passed over",
-       {"SPHardwareDataType"},
+       hardware,
        {"", "<plist", document("<dict><key>_dataType</key><string>SPNVMeData")},
-       {"SPHardwareDataType"}},
-      {"an unreadable main document still gets them",
-       {},
-       {document(typeDict("SPNVMeDataType"))},
-       {"SPNVMeDataType"}},
+       "SPHardwareDataType"},
+      {"an unreadable main document still gets them", "", {document(nvme)}, "SPNVMeDataType"},
   };
   for (const auto& c : cases) {
     Plist root;
-    if (!c.root_types.empty()) {
-      std::string main;
-      for (const std::string& type : c.root_types) main += typeDict(type);
-      ASSERT_TRUE(parsePlist(document(main), &root));
+    if (!c.main.empty()) {
+      ASSERT_TRUE(parsePlist(document(c.main), &root));
     }
     addExtraTypes(c.documents, &root);
-    EXPECT_EQ(dataTypes(root), c.expected) << c.what;
+    std::string types;
+    for (const std::string& type : dataTypes(root)) types += (types.empty() ? "" : " ") + type;
+    EXPECT_EQ(types, c.expected) << c.what;
   }
 }
 

@@ -112,39 +112,43 @@ TEST(QaxReaderTest, DamageIsNamed) {
   for (const auto& c : cases) EXPECT_EQ(c.first, c.second);
 }
 
+// Continuation lines join the value above, each with a warning, and the text
+// renders back as it was. Lines that read one way here but could be markup to
+// another reader are named: the inspector's check fails on them.
 TEST(QaxReaderTest, ContinuationLinesJoinTheValueAbove) {
-  std::string text = kHeader + "+S=first\nsecond\n~note=a\n\nb\n*leaf=\nmore\np=x\ny\n~k=v\n-\n";
-  QaxTree tree;
-  std::vector<std::string> warnings;
-  std::string error;
-  ASSERT_TRUE(parseZxmlText(text, &tree, &warnings, &error)) << error;
-  EXPECT_EQ(warnings.size(), 5u);
-  EXPECT_EQ(tree.top()->value, "first\nsecond");
-  EXPECT_EQ(tree.top()->annotations[0].text, "a\n\nb");
-  EXPECT_EQ(renderZxmlText(tree), text);
-}
-
-// Lines that read one way here but could be markup to another reader: the
-// inspector's check fails on them.
-TEST(QaxReaderTest, TextThatReadsTwoWaysIsNamed) {
-  const std::pair<std::string, std::vector<std::string>> cases[] = {
-      {"+S=v\nplain\n\nmore\n-\n", {}},
+  const struct {
+    std::string text;
+    size_t warnings;
+    std::vector<std::string> ambiguities;
+  } cases[] = {
+      {"+S=first\nsecond\n~note=a\n\nb\n*leaf=\nmore\np=x\ny\n~k=v\n-\n", 5, {}},
       {"+S=v\n-x\n-\n",
+       1,
        {"line 3: continuation line begins with \"-\", which a reader could take for markup"}},
       {"+S=v\n+Evil\n~k=a\n*x\n-\n",
+       2,
        {"line 3: continuation line begins with \"+\", which a reader could take for markup",
         "line 5: continuation line begins with \"*\", which a reader could take for markup"}},
       {"+S=\np=a\n~x\n-=1\n-\n",
+       1,
        {"line 4: continuation line begins with \"~\", which a reader could take for markup",
         "line 5: property name begins with \"-\", which a reader could take for a close"}},
   };
   for (const auto& c : cases) {
     QaxTree tree;
     std::string error;
-    std::vector<std::string> ambiguities;
-    EXPECT_TRUE(parseZxmlText(kHeader + c.first, &tree, nullptr, &error, 0, &ambiguities)) << error;
-    EXPECT_EQ(ambiguities, c.second) << c.first;
+    std::vector<std::string> warnings, ambiguities;
+    ASSERT_TRUE(parseZxmlText(kHeader + c.text, &tree, &warnings, &error, 0, &ambiguities))
+        << error;
+    EXPECT_EQ(warnings.size(), c.warnings) << c.text;
+    EXPECT_EQ(ambiguities, c.ambiguities) << c.text;
+    EXPECT_EQ(renderZxmlText(tree), kHeader + c.text);
   }
+  QaxTree tree;
+  std::string error;
+  ASSERT_TRUE(parseZxmlText(kHeader + cases[0].text, &tree, nullptr, &error));
+  EXPECT_EQ(tree.top()->value, "first\nsecond");
+  EXPECT_EQ(tree.top()->annotations[0].text, "a\n\nb");
 }
 
 // Only well-formed UTF-8 passes into the JSON; every other byte becomes the

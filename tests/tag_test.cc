@@ -13,6 +13,7 @@ TEST(TagTest, PathSettersNotesNoneValuesAndAnnotatePaths) {
   tree.setValue("/a/b/c", TagValue(int64_t{7}), "unit", "GB");  // replaces value and note
   tree.setValue("/a/b/c", TagValue());                          // none: no-op
   tree.setValue("/p", TagValue("1"), "key", nullptr);           // a note needs key and text
+  tree.setValue("/p", TagValue("2"), nullptr, "text");          // whether new or not
   tree.top().setChildValue("leaf", TagValue("v")).setValue(TagValue());
   // Annotating by path walks into the first child of each name.
   Tag& x = tree.top().addChild("x");
@@ -24,7 +25,7 @@ TEST(TagTest, PathSettersNotesNoneValuesAndAnnotatePaths) {
   tree.top().annotateByPath("x/none", "hit", "4");
   TagTree copy(tree);
   EXPECT_EQ(treeText(&copy.top()), R"(+Snapshot=
-p="1"
+p="2"
 +a=
 +b=
 c=7

@@ -7,14 +7,15 @@
 #include <unistd.h>
 
 #include <chrono>
+#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <sstream>
 #include <string>
 #include <thread>
 
 #include "collect/process_group_runner.h"
+#include "corpus_files.h"
 #include "fake_command_runner.h"
 #include "qax_reader.h"
 #include "sections/sections.h"
@@ -34,17 +35,15 @@ int liveMembersOf(pid_t group) {
   for (int attempt = 0; attempt < 100; ++attempt) {
     live = 0;
     for (const auto& entry : std::filesystem::directory_iterator("/proc")) {
-      const std::string name = entry.path().filename().string();
-      if (name.find_first_not_of("0123456789") != std::string::npos) continue;
-      std::ifstream in(entry.path() / "stat");
-      std::string stat((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+      const std::string stat = readWholeFile(entry.path() / "stat");
       size_t close = stat.rfind(')');
-      if (close == std::string::npos) continue;
-      std::istringstream fields(stat.substr(close + 2));
       char state = 0;
       long parent = 0, process_group = 0;
-      fields >> state >> parent >> process_group;
-      if (process_group == group && state != 'Z') ++live;
+      if (close != std::string::npos &&
+          std::sscanf(stat.c_str() + close + 1, " %c %ld %ld", &state, &parent, &process_group) ==
+              3 &&
+          process_group == group && state != 'Z')
+        ++live;
     }
     if (live == 0) break;
     std::this_thread::sleep_for(milliseconds(20));
@@ -52,56 +51,55 @@ int liveMembersOf(pid_t group) {
   return live;
 }
 
+// All side by side in one runner: each ends by its own limit, keeps its own
+// output and leaves nothing of its group.
 TEST(ProcessGroupRunnerTest, EveryCallEndsByItsLimitAndLeavesNothingOfItsGroup) {
   const milliseconds limit(300), grace(300);
+  const std::string interleaved = "for i in 1 2 3; do echo $0$i; sleep 0.05; done";
   const struct {
     const char* what;
-    const char* command;
+    std::string command;
+    size_t chunk;
     std::string output;
     bool timed_out;
     bool waits_for_grace;
   } cases[] = {
-      {"never answers", "sleep 30", "", true, false},
-      {"ignores SIGTERM", "trap '' TERM; sleep 30; sleep 30", "", true, true},
-      {"prints a part, then hangs", "printf 'part\\n'; sleep 30", "part\n", true, false},
-      {"prints after its limit", "sleep 1; echo late", "", true, false},
-      {"ends, leaving a helper behind", "sleep 30 >/dev/null & echo done", "done\n", false, false},
-      {"ends at once", "echo fine; exit 3", "fine\n", false, false},
+      {"never answers", "sleep 30", 4, "", true, false},
+      {"ignores SIGTERM", "trap '' TERM; sleep 30; sleep 30", 4, "", true, true},
+      {"prints a part, then hangs", "printf 'part\\n'; sleep 30", 4, "part\n", true, false},
+      {"prints after its limit", "sleep 1; echo late", 4, "", true, false},
+      {"ends, leaving a helper behind", "sleep 30 >/dev/null & echo done", 4, "done\n", false,
+       false},
+      {"ends at once", "echo fine; exit 3", 4, "fine\n", false, false},
+      {"prints in turns", "sh -c '" + interleaved + "' a", 2, "a1\na2\na3\n", false, false},
+      {"prints in turns too", "sh -c '" + interleaved + "' b", 1, "b1\nb2\nb3\n", false, false},
+      {"cannot start", "exec /nonexistent/tool 2>/dev/null", 64, "", false, false},
   };
-  for (const auto& c : cases) {
-    ProcessGroupRunner runner(grace);
-    Clock::time_point started = Clock::now();
-    runner.start(7, c.command, 4, limit);
-    pid_t group = runner.groupOf(7);
-    ASSERT_GT(group, 0) << c.what;
-    int id = 0;
-    ToolOutput output;
-    ASSERT_TRUE(runner.waitForOne(&id, &output)) << c.what;
+  const size_t count = sizeof cases / sizeof cases[0];
+  ProcessGroupRunner runner(grace);
+  Clock::time_point started = Clock::now();
+  std::vector<pid_t> groups;
+  for (size_t i = 0; i < count; ++i) {
+    runner.start(static_cast<int>(i), cases[i].command, cases[i].chunk,
+                 i < 6 ? limit : std::chrono::seconds(20));
+    groups.push_back(runner.groupOf(static_cast<int>(i)));
+    ASSERT_GT(groups.back(), 0) << cases[i].what;
+  }
+  std::vector<bool> ended(count);
+  int id = 0;
+  ToolOutput output;
+  while (runner.waitForOne(&id, &output)) {
     auto took = std::chrono::duration_cast<milliseconds>(Clock::now() - started);
-    EXPECT_EQ(id, 7) << c.what;
+    const auto& c = cases[id];
+    ended[id] = true;
     EXPECT_EQ(output.text, c.output) << c.what;
     EXPECT_EQ(output.timed_out, c.timed_out) << c.what;
     EXPECT_LT(took, limit + grace + milliseconds(1500)) << c.what;
     EXPECT_EQ(took >= limit + grace, c.waits_for_grace) << c.what;
-    EXPECT_EQ(liveMembersOf(group), 0) << c.what;
-    EXPECT_EQ(runner.groupOf(7), -1) << c.what;
-    EXPECT_FALSE(runner.waitForOne(&id, &output)) << "nothing is left to wait for";
+    EXPECT_EQ(liveMembersOf(groups[id]), 0) << c.what;
+    EXPECT_EQ(runner.groupOf(id), -1) << c.what;
   }
-}
-
-TEST(ProcessGroupRunnerTest, ToolsSideBySideKeepTheirOwnOutputs) {
-  ProcessGroupRunner runner;
-  const std::string interleaved = "for i in 1 2 3; do echo $0$i; sleep 0.05; done";
-  runner.start(1, "sh -c '" + interleaved + "' a", 2, std::chrono::seconds(20));
-  runner.start(2, "sh -c '" + interleaved + "' b", 1, std::chrono::seconds(20));
-  runner.start(3, "exec /nonexistent/tool 2>/dev/null", 64, std::chrono::seconds(20));
-  std::string got[4];
-  int id = 0;
-  ToolOutput output;
-  while (runner.waitForOne(&id, &output)) got[id] = output.text;
-  EXPECT_EQ(got[1], "a1\na2\na3\n");
-  EXPECT_EQ(got[2], "b1\nb2\nb3\n");
-  EXPECT_EQ(got[3], "");
+  EXPECT_EQ(ended, std::vector<bool>(count, true));
   EXPECT_EQ(runner.run("printf x", 1), "x") << "the runner serves again once all have ended";
 }
 
@@ -170,10 +168,7 @@ class HungProfilerTest : public ::testing::Test {
     }
     return -1;
   }
-  std::string out() {
-    std::ifstream in(root_ + "/out");
-    return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
-  }
+  std::string out() { return readWholeFile(root_ + "/out"); }
 
   std::string root_;
 };

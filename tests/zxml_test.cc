@@ -38,10 +38,21 @@ TEST(ZxmlTest, LineKindsValueTextsAndBlocks) {
   Tag& leaf = top.setChildValue("leaf", TagValue(1.0));
   leaf.addAnnotation("split", ",");
   top.addChild("bare");
-  std::string text = kHeader +
-                     "+AssetInfo=\n~complex=\nyes=true\nno=false\nneg=-9223372036854775808\nnone=\n"
-                     "odd=a=b~c+d*e-f\n~base-value=1024\n*leaf=1.00\n~split=,\n*bare=\n-\n";
+  // Each kind of line escapes its own texts, and the size estimate stays an
+  // upper bound however long the texts are.
+  Tag& section = top.addChild("Processes");
+  Tag& process = section.setChildValue("process:1", TagValue("z\n-\n+Evil=1"));
+  process.addAnnotation("no\nte=", "t\n~x");
+  process.setProperty("cmd=line", TagValue(std::string("a\0b", 3)), "k", "v\n-");
+  section.setChildValue("=eq", TagValue(std::string(kMaxZxmlText + 5, 'n')));
+  std::string text =
+      kHeader +
+      "+AssetInfo=\n~complex=\nyes=true\nno=false\nneg=-9223372036854775808\nnone=\n"
+      "odd=a=b~c+d*e-f\n~base-value=1024\n*leaf=1.00\n~split=,\n*bare=\n" +
+      "+Processes=\n*process:1=z - +Evil=1\n~no te_=t ~x\ncmd_line=a\n~k=v -\n*_eq=" +
+      std::string(kMaxZxmlText, 'n') + "\n-\n-\n";
   EXPECT_EQ(dump(tree), text);
+  EXPECT_LT(tree.textSize(), text.size() + 200);
   std::vector<uint8_t> plain = tree.serialise(kUncompressed, kWholeText);  // padded to the estimate
   EXPECT_EQ(std::string(plain.begin(), plain.end()),
             text + std::string(tree.textSize() - text.size(), '\0'));
@@ -120,21 +131,6 @@ TEST(ZxmlTest, CollectedTextCannotWriteMarkup) {
     std::string shown = c.text.substr(0, 40);
     EXPECT_EQ(zxmlText(c.text, c.field), c.stored) << shown;
   }
-}
-
-// Each kind of line escapes its own texts, and the size estimate stays an
-// upper bound however long the texts are.
-TEST(ZxmlTest, DumpEscapesEveryNameAndValue) {
-  TagTree tree(true, "Snapshot");
-  Tag& section = tree.top().addChild("Processes");
-  Tag& process = section.setChildValue("process:1", TagValue("z\n-\n+Evil=1"));
-  process.addAnnotation("no\nte=", "t\n~x");
-  process.setProperty("cmd=line", TagValue(std::string("a\0b", 3)), "k", "v\n-");
-  section.setChildValue("=eq", TagValue(std::string(kMaxZxmlText + 5, 'n')));
-  const std::string text = dump(tree);
-  EXPECT_EQ(text, kHeader + "+Snapshot=\n+Processes=\n*process:1=z - +Evil=1\n~no te_=t ~x\n" +
-                      "cmd_line=a\n~k=v -\n*_eq=" + std::string(kMaxZxmlText, 'n') + "\n-\n-\n");
-  EXPECT_LT(tree.textSize(), text.size() + 200);
 }
 
 TEST(ZxmlTest, MatchesOneShotLevel9AroundTheChunkSize) {
