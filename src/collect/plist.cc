@@ -3,67 +3,22 @@
 #include <expat.h>
 
 #include <algorithm>
-#include <functional>
 #include <memory>
-#include <unordered_map>
+#include <string>
+#include <string_view>
 #include <utility>
-#include <vector>
 
+#include "collect/plist_builder.h"
 #include "collect/plist_bytes.h"
+#include "collect/plist_frames.h"
 #include "collect/plist_leaves.h"
 
 namespace cvn {
-
-// The reader's access to the handles' insides; texts and lists given to it
-// already live in the arena that ends up in the Plist.
-class PlistBuilder {
- public:
-  using Kind = PlistValue::Kind;
-
-  static PlistValue text(Kind kind, std::string_view text) {
-    PlistValue value;
-    value.kind_ = kind;
-    value.text_ = text.data();
-    value.size_ = text.size();
-    return value;
-  }
-  static PlistValue number(Kind kind, int64_t number) {
-    PlistValue value;
-    value.kind_ = kind;
-    value.integer_ = number;
-    return value;
-  }
-  static PlistValue real(double real) {
-    PlistValue value;
-    value.kind_ = Kind::kReal;
-    value.real_ = real;
-    return value;
-  }
-  static PlistValue array(const PlistValue* items, size_t size) {
-    PlistValue value;
-    value.kind_ = Kind::kArray;
-    value.items_ = items;
-    value.size_ = size;
-    return value;
-  }
-  static PlistValue dictionary(const PlistEntry* entries, size_t size) {
-    PlistValue value;
-    value.kind_ = Kind::kDictionary;
-    value.entries_ = entries;
-    value.size_ = size;
-    return value;
-  }
-  static void take(const PlistValue& root, Arena&& arena, Plist* out) {
-    static_cast<PlistValue&>(*out) = root;
-    out->arena_ = std::move(arena);
-  }
-};
 
 namespace {
 
 constexpr size_t kMaxDepth = 256;
 constexpr size_t kChunkSize = 1 << 20;
-constexpr size_t kIndexThreshold = 16;
 
 enum class Element {
   kPlist,
@@ -94,68 +49,6 @@ Element elementOf(const char* name) {
   return Element::kUnknown;
 }
 
-struct Frame {
-  bool is_array = false;
-  std::vector<PlistValue> items;
-  std::vector<PlistEntry> entries;
-  std::string_view key;  // in the arena
-  bool has_key = false;
-  bool key_refused = false;
-  // Key positions, kept once a dictionary outgrows a linear search.
-  bool indexed = false;
-  std::unordered_map<std::string_view, size_t> index;
-};
-
-// The open containers. A frame's lists are filled in place and keep their
-// room when the container closes: the next container at that depth grows
-// into it, and each closed container gets one list of its exact size in the
-// arena. A list growing one entry at a time instead allocated and moved its
-// entries several times for every dictionary of the document.
-class FrameStack {
- public:
-  bool empty() const { return depth_ == 0; }
-  size_t size() const { return depth_; }
-  Frame& back() { return frames_[depth_ - 1]; }
-
-  void push(bool is_array) {
-    if (depth_ == frames_.size()) frames_.emplace_back();
-    Frame& frame = frames_[depth_++];
-    frame.is_array = is_array;
-    frame.items.clear();
-    frame.entries.clear();
-    frame.key = std::string_view();
-    frame.has_key = false;
-    frame.key_refused = false;
-    if (frame.indexed) frame.index.clear();
-    frame.indexed = false;
-  }
-
-  PlistValue pop(Arena& arena) {
-    Frame& frame = frames_[--depth_];
-    if (frame.is_array) {
-      PlistValue value = PlistBuilder::array(copyList(frame.items, arena), frame.items.size());
-      frame.items.clear();
-      return value;
-    }
-    PlistValue value =
-        PlistBuilder::dictionary(copyList(frame.entries, arena), frame.entries.size());
-    frame.entries.clear();
-    return value;
-  }
-
- private:
-  template <typename T>
-  static const T* copyList(const std::vector<T>& list, Arena& arena) {
-    if (list.empty()) return nullptr;
-    T* copy = static_cast<T*>(arena.allocate(sizeof(T) * list.size(), alignof(T)));
-    std::uninitialized_copy(list.begin(), list.end(), copy);
-    return copy;
-  }
-
-  std::vector<Frame> frames_;
-  size_t depth_ = 0;
-};
-
 class Reader {
  public:
   bool read(std::string_view document, Plist* out, std::string* warning);
@@ -175,12 +68,11 @@ class Reader {
   bool readLeaf(PlistValue* value);
   void attach(const PlistValue& value);
   void drop(const char* why);
-  void insert(Frame& frame, std::string_view key, const PlistValue& value);
   void note(const std::string& problem);
 
   XML_Parser parser_ = nullptr;
   Arena arena_;
-  FrameStack stack_;
+  PlistFrameStack stack_;
   // Profiler dictionaries repeat a few dozen keys once per item.
   SharedTexts keys_;
   // The leaf element being read, if any; leaves never nest.
@@ -205,29 +97,6 @@ void Reader::note(const std::string& problem) {
   }
 }
 
-void Reader::insert(Frame& frame, std::string_view key, const PlistValue& value) {
-  std::vector<PlistEntry>& entries = frame.entries;
-  if (frame.indexed) {
-    auto [found, added] = frame.index.try_emplace(key, entries.size());
-    if (!added) {
-      entries[found->second].value = value;
-      return;
-    }
-  } else {
-    for (PlistEntry& entry : entries) {
-      if (entry.key == key) {
-        entry.value = value;
-        return;
-      }
-    }
-  }
-  entries.push_back(PlistEntry{key, value});
-  if (!frame.indexed && entries.size() > kIndexThreshold) {
-    frame.indexed = true;
-    for (size_t i = 0; i < entries.size(); ++i) frame.index.emplace(entries[i].key, i);
-  }
-}
-
 void Reader::attach(const PlistValue& value) {
   if (stack_.empty()) {
     if (!root_done_) {
@@ -238,7 +107,7 @@ void Reader::attach(const PlistValue& value) {
     }
     return;
   }
-  Frame& frame = stack_.back();
+  PlistFrame& frame = stack_.back();
   if (frame.is_array) {
     frame.items.push_back(value);
     return;
@@ -249,7 +118,7 @@ void Reader::attach(const PlistValue& value) {
   }
   frame.has_key = false;
   if (frame.key_refused) return;
-  insert(frame, frame.key, value);
+  frame.insert(frame.key, value);
 }
 
 void Reader::drop(const char* why) {
@@ -305,7 +174,7 @@ void Reader::finishLeaf() {
       note("key outside a dictionary");
       return;
     }
-    Frame& frame = stack_.back();
+    PlistFrame& frame = stack_.back();
     if (frame.has_key) note("key without a value");
     frame.has_key = true;
     frame.key_refused = !readable;
