@@ -69,17 +69,6 @@ TEST(ProcessorsSectionTest, PackageCoreAndCacheRules) {
     EXPECT_EQ(buildProcessors({{"packages", packages}}), "") << packages.textForm();
 }
 
-TEST(ProcessorsSectionTest, AppleSiliconIsOneChipWithItsCoresAndNoClockSpeedOrCaches) {
-  EXPECT_EQ(buildProcessors({{"chip_type", "Apple M3 Pro"},
-                             {"number_processors", "proc 12:6:6"},
-                             {"physical_memory", "18 GB"}}),
-            R"txt(+Processors=
-*Processor:1="Apple M3 Pro"
-core-count=12
--
-)txt");
-}
-
 TEST(ProcessorsSectionTest, ChipNamesAndCoreTexts) {
   // Values: name, cores, L2 KB, L3 KB.
   const std::pair<Keys, const char*> cases[] = {
