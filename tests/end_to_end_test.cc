@@ -370,9 +370,6 @@ TEST_F(EndToEndTest, BrokenHugeAndHostileToolOutputStillGivesACheckedFile) {
   ASSERT_EQ(posix_spawn(&hostile, program.c_str(), nullptr, nullptr, argv, environ), 0);
 
   using Edit = std::function<void(const std::string& mac)>;
-  auto replace = [](std::string file, std::string from, std::string to) -> Edit {
-    return [=](const std::string& mac) { replaceIn(mac + "/" + file, from, to); };
-  };
   const std::string apps = "profiler/SPApplicationsDataType.xml";
   const std::string huge_name = [] {
     std::string e;
@@ -385,14 +382,17 @@ TEST_F(EndToEndTest, BrokenHugeAndHostileToolOutputStillGivesACheckedFile) {
     const char* property;  // empty: the tag's own value
     std::string value;
   };
-  const struct {
+  struct Route {
     const char* route;
-    Edit edit;
     bool clean_shape;
     std::string name;  // empty: the sample Mac's
+    Edit edit;
     std::vector<Value> values;
-  } routes[] = {
+  };
+  std::vector<Route> routes = {
       {"malformed, short and cut profiler outputs",
+       false,
+       "",
        [](const std::string& mac) {
          const std::string profiler = mac + "/profiler/";
          std::string software = readFile(profiler + "SPSoftwareDataType.xml");
@@ -405,8 +405,6 @@ TEST_F(EndToEndTest, BrokenHugeAndHostileToolOutputStillGivesACheckedFile) {
          writeFile(profiler + "SPUSBDataType.xml", usb.substr(0, usb.size() / 2));
          writeFile(profiler + "SPHardwareDataType.xml", std::string(400, '#') + "\n");
        },
-       false,
-       "",
        {{0, "/System/Computer-system", "", "<no node>"},
         {0, "/System/Mem-slots", "", ""},
         {0, "/Network/Adapters/net-adapter:2", "ip-address", "192.168.1.23"},
@@ -415,26 +413,28 @@ TEST_F(EndToEndTest, BrokenHugeAndHostileToolOutputStillGivesACheckedFile) {
         {0, "/Security/Firewall", "", ""},           // types after it survive
         {1, "/", "mac-address", "00-26-BB-5C-3A-91"}}},
       {"no XML at all",
+       false,
+       hostNamePart() + "_.qax",
        [](const std::string& mac) {
          for (const auto& entry : std::filesystem::directory_iterator(mac + "/profiler"))
            writeFile(entry.path().string(), std::string(400, '#') + "\n");
        },
-       false,
-       hostNamePart() + "_.qax",
        {{0, "/System", "", "<no node>"},
         {0, "/User-accounts", "", ""},
         {1, "/", "mac-address", ""}}},
       {"no Ethernet data, so no service matches",
+       true,
+       hostNamePart() + "_.qax",
        [](const std::string& mac) {
          replaceIn(mac + "/profiler/SPNetworkDataType.xml", "<key>Ethernet</key>",
                    "<key>Ethernet_x</key>", true);
        },
-       true,
-       hostNamePart() + "_.qax",
        {{0, "/", "ip-address", "192.168.1.23"},
         {0, "/", "hostname", ""},
         {1, "/", "mac-address", ""}}},
       {"a fifty megabyte application list",
+       false,
+       "",
        [&](const std::string& mac) {
          std::string text = readFile(mac + "/" + apps);
          std::string extra;
@@ -450,72 +450,63 @@ TEST_F(EndToEndTest, BrokenHugeAndHostileToolOutputStillGivesACheckedFile) {
          ASSERT_GT(text.size(), 50u * 1000 * 1000);
          writeFile(mac + "/" + apps, text);
        },
-       false,
-       "",
        {{0, "/Software/Soft:Generated 5599 1.0", "", "Generated 5599"},
         {0, "/Software/Soft:Safari 5.1", "", "Safari"}}},
       // One name of 150 MB: every text is cut at 1 MiB on a UTF-8 boundary,
       // so the file stays one that a reader can inflate. "Soft:" is odd, so
       // the record name's cut would split an é.
       {"a huge application name",
+       true,
+       "",
        [&](const std::string& mac) {
          std::string huge;
          huge.reserve(150u << 20);
          while (huge.size() < (150u << 20)) huge += "\xC3\xA9";
          replaceIn(mac + "/" + apps, "<string>Safari</string>", "<string>" + huge + "</string>");
        },
-       true,
-       "",
        {{0, "/Software/Soft:" + huge_name, "", huge_name + "\xC3\xA9\xC3\xA9\xC3\xA9"}}},
-      {"application name",
-       replace(apps, "<string>Safari</string>", "<string>Safari\n-\n+Evil=1</string>"),
-       true,
-       "",
-       {{0, "/Software/Soft:Safari - +Evil_1 5.1", "", "Safari - +Evil=1"}}},
-      {"application name, unbalanced",
-       replace(apps, "<string>Mail</string>", "<string>Mail\n-\n-\n-\n</string>"),
-       true,
-       "",
-       {{0, "/Software/Soft:Mail - - -  4.5", "", "Mail - - -\n"}}},
-      {"application name with NUL",
-       replace(apps, "<string>Terminal</string>",
-               std::string("<string>Term\0inal\n-</string>", 28)),
-       true,
-       "",
-       {{0, "/Software/Soft:Term", "", "Term"}}},
-      {"dscl RealName",
-       replace("users/jane.txt", "RealName:\n Jane Appleseed\n",
-               "RealName:\n Jane Appleseed\n-\n+Evil=1\n"),
-       true,
-       "",
-       {{0, "/User-accounts/usr-acc:jane", "fullname", "Jane Appleseed - +Evil=1"}}},
-      {"dscl RealName on two lines",
-       replace("users/admin.txt", "RealName: Administrator\n",
-               "RealName: Carol Q. Example\n Administrator\n"),
-       true,
-       "",
-       {{0, "/User-accounts/usr-acc:admin", "fullname", "Carol Q. Example\n Administrator"}}},
-      {"USB volume name",
-       replace("profiler/SPUSBDataType.xml", "<string>JANE_USB</string>",
-               "<string>JANE_USB\n-\n-\n+Evil=1</string>"),
-       true,
-       "",
-       {{0, "/Storage/Logical-disks/partition:3", "", "JANE_USB - - +Evil=1"}}},
-      {"diskutil media name",
-       replace("diskutil/disk2.txt", "Flash Disk Media", "Flash\n-\n+Evil=1 Media"),
-       true,
-       "",
-       {{0, "/Storage/Physical-disks/Removable:1", "model", "Flash - +Evil=1"}}},
       {"user folder with =",
+       true,
+       "",
        [](const std::string& mac) {
          replaceIn(mac + "/users/ls.txt", "jane\n", "=eq\n");
          replaceIn(mac + "/users/jane.txt", "RecordName: jane", "RecordName: =eq");
          std::rename((mac + "/users/jane.txt").c_str(), (mac + "/users/=eq.txt").c_str());
        },
-       true,
-       "",
        {{0, "/User-accounts/usr-acc:_eq", "hdir", "/users/=eq"}}},
   };
+  // Text a local user controls, and where it must read back defused.
+  const struct {
+    const char *route, *file;
+    std::string from, to, path;
+    const char* property;
+    std::string stored;
+  } texts[] = {
+      {"application name", "profiler/SPApplicationsDataType.xml", "<string>Safari</string>",
+       "<string>Safari\n-\n+Evil=1</string>", "/Software/Soft:Safari - +Evil_1 5.1", "",
+       "Safari - +Evil=1"},
+      {"application name, unbalanced", "profiler/SPApplicationsDataType.xml",
+       "<string>Mail</string>", "<string>Mail\n-\n-\n-\n</string>",
+       "/Software/Soft:Mail - - -  4.5", "", "Mail - - -\n"},
+      {"application name with NUL", "profiler/SPApplicationsDataType.xml",
+       "<string>Terminal</string>", std::string("<string>Term\0inal\n-</string>", 28),
+       "/Software/Soft:Term", "", "Term"},
+      {"dscl RealName", "users/jane.txt", "RealName:\n Jane Appleseed\n",
+       "RealName:\n Jane Appleseed\n-\n+Evil=1\n", "/User-accounts/usr-acc:jane", "fullname",
+       "Jane Appleseed - +Evil=1"},
+      {"dscl RealName on two lines", "users/admin.txt", "RealName: Administrator\n",
+       "RealName: Carol Q. Example\n Administrator\n", "/User-accounts/usr-acc:admin", "fullname",
+       "Carol Q. Example\n Administrator"},
+      {"USB volume name", "profiler/SPUSBDataType.xml", "<string>JANE_USB</string>",
+       "<string>JANE_USB\n-\n-\n+Evil=1</string>", "/Storage/Logical-disks/partition:3", "",
+       "JANE_USB - - +Evil=1"},
+      {"diskutil media name", "diskutil/disk2.txt", "Flash Disk Media", "Flash\n-\n+Evil=1 Media",
+       "/Storage/Physical-disks/Removable:1", "model", "Flash - +Evil=1"},
+  };
+  for (const auto& t : texts) {
+    Edit edit = [&t](const std::string& mac) { replaceIn(mac + "/" + t.file, t.from, t.to); };
+    routes.push_back({t.route, true, "", edit, {{0, t.path, t.property, t.stored}}});
+  }
   for (const auto& r : routes) {
     SCOPED_TRACE(r.route);
     r.edit(copySampleMac());
