@@ -117,33 +117,6 @@ TEST(CorpusScanTest, DiskSizes) {
   EXPECT_EQ(diskSizes("SPNVMeDataType.xml"), "HDD:1 500 500277792768\n");
 }
 
-// A 2016 Intel Mac's mounted volume, on CoreStorage, with byte counts only.
-TEST(CorpusScanTest, AMountedVolumeWithByteCountsOnly) {
-  if (findCorpus().empty()) GTEST_SKIP() << "no recorded outputs";
-  TagTree raw = rawTreeOf(
-      "ohai/test-data/unit/plugins/darwin/hardware_system_profiler_output.rb.d/"
-      "HardwareSystemProfilerOutput_Storage.xml");
-  TagTree snapshot(true, "Snapshot");
-  WrittenVolumes volumes;
-  buildStorageSection(snapshot, raw, volumes);
-  EXPECT_EQ(treeText(snapshot.top().findChild("Storage")), R"(+Storage=
-+Logical-disks=
-*partition:1="Macintosh HD"
-file-sys="Journaled HFS+"
-size=249.66
-~base-value=249661751296
-free=23.86
-~base-value=23864803328
-mount-point="/"
-used%=90
-~pos=225.80
-~max=249.66
-~val-units=GB
--
--
-)");
-}
-
 TEST(CorpusScanTest, ModelSerialAndMemoryOfThreeMacs) {
   if (findCorpus().empty()) GTEST_SKIP() << "no recorded profiler outputs at hand";
   const std::string ohai = "ohai/test-data/unit/plugins/darwin/";

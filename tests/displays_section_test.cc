@@ -31,7 +31,6 @@ TEST(DisplaysSectionTest, AdaptersMonitorsResolutionsAndVideoMemory) {
            {"item1/spdisplays_ndrvs/item1/_spdisplays_pixels", "3840 x 2160"},
            {"item2/spdisplays_vram", "0 MB"},
            {"item2/spdisplays_vram_shared", "1 GB"},
-           {"item3/spdisplays_vram", int64_t{512}},
        })
     raw.setValue(std::string("/SPDisplaysDataType/_items/") + path, value);
   buildDisplaysSection(snapshot, raw);
@@ -42,8 +41,6 @@ Video-adapter:1=""
 Video-adapter:2=""
 ~complex=
 Video-adapter:3=""
-~complex=
-Video-adapter:4=""
 ~complex=
 *Video-adapter:1=
 model="ATI Radeon HD 5770"
@@ -62,12 +59,6 @@ device-id=
 revision-id=
 bus=
 *Video-adapter:3=
-model=
-vendor=
-device-id=
-revision-id=
-bus=
-*Video-adapter:4=
 model=
 vendor=
 device-id=
