@@ -10,7 +10,6 @@
 #include "collect/plist_converter.h"
 #include "corpus_files.h"
 #include "fake_command_runner.h"
-#include "fake_file_system.h"
 #include "fake_scan_sources.h"
 #include "main/scan_pipeline.h"
 #include "qax_reader.h"
@@ -18,7 +17,6 @@
 #include "sections/edid.h"
 #include "sections/sections.h"
 #include "sections/written_volumes.h"
-#include "tree_text.h"
 #include "zxml/tag.h"
 
 namespace cvn {
@@ -115,28 +113,6 @@ TEST(CorpusScanTest, DiskSizes) {
   EXPECT_EQ(diskSizes("SPUSBDataType2.xml"), "Removable:1 8\nRemovable:2 500\nRemovable:3 2\n");
   // An Apple Silicon Mac of 2026: only APFS containers, none of them a volume.
   EXPECT_EQ(diskSizes("SPNVMeDataType.xml"), "HDD:1 500 500277792768\n");
-}
-
-TEST(CorpusScanTest, ModelSerialAndMemoryOfThreeMacs) {
-  if (findCorpus().empty()) GTEST_SKIP() << "no recorded profiler outputs at hand";
-  const std::string ohai = "ohai/test-data/unit/plugins/darwin/";
-  // Each: the recording, then the model, serial and memory lines it must give.
-  const std::string machines[][4] = {
-      {ohai + "system_profiler_output.rb.d/SystemProfilerOutput_Full.xml",
-       "model=\"MacBookPro8,2\"", "serial=\"ABCDEFG12345\"", "physical-memory=8192\n"},
-      {"grr/grr/test/grr_response_test/test_data/system_profiler.xml", "model=\"MacBookPro10,1\"",
-       "serial=\"C02JQ0F5F6L9\"", "physical-memory=16384\n"},
-      {ohai + "hardware_system_profiler_output.rb.d/HardwareSystemProfilerOutput_Hardware.xml",
-       "model=\"MacBookPro11,1\"", "serial=\"ABCDEFG12345\"", "physical-memory=16384\n"},
-  };
-  for (const auto& machine : machines) {
-    TagTree raw = rawTreeOf(machine[0]), snapshot(true, "Snapshot");
-    buildSystemSection(snapshot, raw, "ioreg's");
-    buildMemorySection(snapshot, raw);
-    const std::string text = treeText(&snapshot.top());
-    for (int i = 1; i < 4; ++i) EXPECT_NE(text.find(machine[i]), std::string::npos) << machine[i];
-    EXPECT_EQ(text.find("ioreg's"), std::string::npos);  // every one has its UUID
-  }
 }
 
 }  // namespace

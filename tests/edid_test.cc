@@ -25,6 +25,7 @@ TEST(EdidTest, MaxResolutionFollowsTheTimingRules) {
       {"byte 35 of 4", edidText({{35, "04"}}), "640 x 480"},
       {"byte 35 of 64", edidText({{35, "40"}}), "720 x 400"},
       {"byte 36 of 64", edidText({{36, "40"}}), "800 x 600"},
+      {"byte 36 bit 5", edidText({{36, "20"}}), "832 x 624"},
       {"byte 36 bits 1 and 5", edidText({{36, "22"}}), "1024 x 768"},
       {"byte 36 bit 0 alone", edidText({{36, "01"}}), ""},
       {"byte 37 of 1", edidText({{37, "01"}}), "1280 x 1024"},
