@@ -22,6 +22,10 @@ TEST(EdidTest, MaxResolutionFollowsTheTimingRules) {
   const std::tuple<const char*, std::string, const char*> cases[] = {
       {"all timing bytes zero", edidText({}), ""},
       {"byte 35 of 3", edidText({{35, "03"}}), "800 x 600"},
+      {"byte 35 of 4", edidText({{35, "04"}}), "640 x 480"},
+      {"byte 35 of 64", edidText({{35, "40"}}), "720 x 400"},
+      {"byte 36 of 64", edidText({{36, "40"}}), "800 x 600"},
+      {"byte 36 bit 5", edidText({{36, "20"}}), "832 x 624"},
       {"byte 36 bits 1 and 5", edidText({{36, "22"}}), "1024 x 768"},
       {"byte 36 bit 0 alone", edidText({{36, "01"}}), ""},
       {"byte 37 of 1", edidText({{37, "01"}}), "1280 x 1024"},
@@ -46,6 +50,20 @@ TEST(EdidTest, DecodesIdentityDateDiagonalAndText) {
   EXPECT_EQ(info.manufacturer + " " + info.week + " " + info.year + " " + info.aspect_ratio,
             "DEL 49 2010 16:10");
   EXPECT_EQ(edidDiagonalText(edidText({{21, "2f1e"}})), "22");
+  // Input, synchronisation, serial flag, colour, power modes and gamma.
+  const std::pair<std::string, const char*> features[] = {
+      {edidText({{20, "80"}, {23, "78"}, {24, "ea"}}),
+       "Digital||0|RGB color|Standby, Suspend, Active off|2.20"},
+      {edidText({{20, "81"}, {23, "ff"}, {24, "04"}}), "Digital||1|Monochrome, sRGB||"},
+      {edidText({{20, "0f"}, {23, "00"}, {24, "18"}}),
+       "Analog|Separate, Composite, Sync on green, Serration|0|Undefined||1.00"},
+  };
+  for (const auto& [edid, expected] : features) {
+    ASSERT_TRUE(decodeEdidText(edid, &info));
+    EXPECT_EQ(info.video_input + "|" + info.synch_input + "|" + info.serial_digital + "|" +
+                  info.color_features + "|" + info.dpms_mode_support + "|" + info.gamma,
+              expected);
+  }
   EXPECT_EQ(edidDiagonalText(edidText({{21, "2f"}})), "");
 
   // The text form needs a whole block of hexadecimal pairs.

@@ -55,24 +55,6 @@ physical-memory=2048000
   EXPECT_EQ(buildMemory(hardware_only), "+Memory=\n*General-info=\nphysical-memory=4096\n-\n");
 }
 
-TEST(MemorySectionTest, AppleSiliconMemoryIsOneRecordWithoutSlots) {
-  TagTree raw(true, "Macintosh");
-  raw.setValue("/SPMemoryDataType/_items/item0/SPMemoryDataType", "16 GB");
-  raw.setValue("/SPMemoryDataType/_items/item0/dimm_manufacturer", "Hynix");
-  raw.setValue("/SPMemoryDataType/_items/item0/dimm_type", "LPDDR5");
-  raw.setValue("/SPHardwareDataType/_items/item0/physical_memory", "16 GB");
-  EXPECT_EQ(buildMemory(raw), R"txt(+Memory=
-*Memory-slot:1=
-used="1"
-manuf="Hynix"
-capacity=16384
-mem-type="LPDDR5"
-*General-info=
-physical-memory=16384
--
-)txt");
-}
-
 TEST(MemorySectionTest, SizeInMegabytesAtItsBoundaries) {
   // A decimal comma reads as a point; the result is truncated, not rounded;
   // units are case-sensitive; sizes beyond float (which must not even be

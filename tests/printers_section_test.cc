@@ -24,11 +24,6 @@ TEST(PrintersSectionTest, PrintersMultifunctionDevicesAndScanners) {
   set(2, "_name", "Flatbed");
   set(2, "scanner", "yes");
   set(2, "scannerapppath", "/Applications/Scan.app");
-  set(3, "_name", "Fax");
-  set(3, "default", "no");
-  set(3, "scanner", "no");
-  set(3, "fax", "yes");
-  set(3, "printserver", "cups.example.com");
   TagTree snapshot(true, "Snapshot");
   buildPrintersSection(snapshot, raw);
   EXPECT_EQ(treeText(snapshot.top().findChild("Peripherals")), R"(+Peripherals=
@@ -39,11 +34,6 @@ is-default="1"
 status=
 scanner-uuid=
 scanner-app-path="/Applications/Image Capture.app"
-*Printer:2="Fax"
-is-default="0"
-status=
-is-fax="1"
-print-server="cups.example.com"
 -
 +Scanners=
 *Scanner:1="Flatbed"

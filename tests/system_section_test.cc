@@ -65,26 +65,5 @@ wake-on-clamshell-open="0"
 )txt");
 }
 
-// Apple Silicon: the chip and its soldered memory, which has no slot.
-TEST(SystemSectionTest, AppleSiliconHasNoMemorySlots) {
-  TagTree raw(true, "Macintosh");
-  raw.setValue("/SPHardwareDataType/_items/item0/machine_model", "Mac15,6");
-  raw.setValue("/SPHardwareDataType/_items/item0/platform_UUID", "UUID-1");
-  raw.setValue("/SPHardwareDataType/_items/item0/serial_number", "FVFM3PRO15");
-  raw.setValue("/SPMemoryDataType/_items/item0/SPMemoryDataType", "18 GB");
-  raw.setValue("/SPMemoryDataType/_items/item0/dimm_type", "LPDDR5");
-  TagTree snapshot(true, "Snapshot");
-  buildSystemSection(snapshot, raw, "ioreg's, not used");
-  EXPECT_EQ(treeText(snapshot.top().findChild("System")), R"txt(+System=
-*Computer-system=
-model="Mac15,6"
-uuid="UUID-1"
-*Chassis=
-manuf="Apple Inc."
-serial="FVFM3PRO15"
--
-)txt");
-}
-
 }  // namespace
 }  // namespace cvn
