@@ -5,6 +5,9 @@
 #define CVN_COLLECT_INTERRUPT_WATCH_H_
 
 #include <csignal>
+#include <optional>
+
+#include "collect/interrupt_signals.h"
 
 namespace cvn {
 
@@ -30,8 +33,7 @@ class InterruptWatch {
 
  private:
   sigset_t old_mask_;
-  struct sigaction old_actions_[3];
-  bool installed_[3] = {false, false, false};
+  std::optional<InterruptHandlers> handlers_;
 };
 
 }  // namespace cvn

@@ -10,13 +10,10 @@
 #include <cstring>
 #include <memory>
 
+#include "collect/interrupt_signals.h"
+
 namespace cvn {
 namespace {
-
-// Every save is in one of these ends by a signal a person or a session sends:
-// Ctrl-C, kill, a closed SSH connection.
-constexpr int kCleanupSignals[] = {SIGINT, SIGTERM, SIGHUP};
-constexpr size_t kCleanupSignalCount = sizeof kCleanupSignals / sizeof kCleanupSignals[0];
 
 // What an interrupted save must remove: the temporary file, and the claimed
 // name on a file system without hard links. The signal handler reads these,
@@ -38,9 +35,7 @@ extern "C" void removePendingAndRaise(int signal_number) {
 class HeldSignals {
  public:
   HeldSignals() {
-    sigset_t set;
-    sigemptyset(&set);
-    for (int s : kCleanupSignals) sigaddset(&set, s);
+    sigset_t set = interruptSignalSet();
     sigprocmask(SIG_BLOCK, &set, &old_);
   }
   // Keeps errno: callers read it after the step this scope guarded.
@@ -54,35 +49,6 @@ class HeldSignals {
 
  private:
   sigset_t old_;
-};
-
-// The cleanup handler for the length of a save. A signal someone chose to
-// ignore (nohup) stays ignored.
-class CleanupOnSignals {
- public:
-  CleanupOnSignals() {
-    struct sigaction action;
-    std::memset(&action, 0, sizeof action);
-    action.sa_handler = removePendingAndRaise;
-    sigemptyset(&action.sa_mask);
-    for (int s : kCleanupSignals) sigaddset(&action.sa_mask, s);
-    action.sa_flags = SA_RESETHAND;
-    for (size_t i = 0; i < kCleanupSignalCount; ++i) {
-      installed_[i] = sigaction(kCleanupSignals[i], nullptr, &old_[i]) == 0 &&
-                      old_[i].sa_handler == SIG_DFL &&
-                      sigaction(kCleanupSignals[i], &action, nullptr) == 0;
-    }
-  }
-  ~CleanupOnSignals() {
-    for (size_t i = 0; i < kCleanupSignalCount; ++i)
-      if (installed_[i]) sigaction(kCleanupSignals[i], &old_[i], nullptr);
-  }
-  CleanupOnSignals(const CleanupOnSignals&) = delete;
-  CleanupOnSignals& operator=(const CleanupOnSignals&) = delete;
-
- private:
-  struct sigaction old_[kCleanupSignalCount];
-  bool installed_[kCleanupSignalCount] = {};
 };
 
 // A file this save created and removes again unless told to keep it.
@@ -190,7 +156,9 @@ int WorkingDirectory::linkName(const char* existing, const char* new_name) {
 
 SaveOutcome WorkingDirectory::writeFile(const std::string& full_path,
                                         const std::vector<uint8_t>& image) {
-  CleanupOnSignals cleanup;
+  // For the length of the save: an interrupted one ends as it would have
+  // without it, once what it made is removed.
+  InterruptHandlers cleanup(removePendingAndRaise, SA_RESETHAND);
   const std::string folder = folderOf(full_path);
   PendingFile temporary(0);
   bool created = false;
