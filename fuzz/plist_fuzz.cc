@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "../tests/plist_path_reference.h"
+#include "plist_path_reference.h"
 #include "../tests/tree_text.h"
 #include "collect/network_identity.h"
 #include "collect/plist.h"

@@ -16,39 +16,6 @@
 namespace cvn {
 namespace {
 
-TEST(UsersSectionTest, ReadsEachHomeFolderThatHasAnAccount) {
-  FakeCommandRunner runner;
-  // "Guest" is not a complete line and is never looked up.
-  runner.answer("ls -1 /Users/", "Alice\nShared\nbob\nGuest");
-  runner.answer("dscl . -read \"/users/Alice\"",
-                "\nNFSHomeDirectory: /Users/alice\nPrimaryGroupID: 20\nRealName:\n Alice\n"
-                " Example \nRecordName: alice\nRecordType: Users\nUniqueID: 501\n");
-  runner.answer("dscl . -read \"/users/Shared\"", "RecordName: Shared\n");
-  // No UserShell for Alice; a label that ends bob's output.
-  runner.answer("dscl . -read \"/users/bob\"",
-                "\nNFSHomeDirectory:\nRecordName: bob\nRecordType: t\nUserShell:");
-  TagTree snapshot(true, "Snapshot");
-  buildUsersSection(snapshot, runner);
-  EXPECT_EQ(treeText(snapshot.top().findChild("User-accounts")), R"(+User-accounts=
-*usr-acc:alice="alice"
-fullname="Alice
- Example"
-group="20"
-id="501"
-hdir="/users/Alice"
-is-system-user="0"
-*usr-acc:bob="bob"
-shell=""
-hdir="/users/bob"
-is-system-user="0"
--
-)");
-  EXPECT_EQ(
-      runner.commands_ran_,
-      (std::vector<std::string>{"ls -1 /Users/", "dscl . -read \"/users/Alice\"",
-                                "dscl . -read \"/users/Shared\"", "dscl . -read \"/users/bob\""}));
-}
-
 // Hands out a canned listing and runs dscl commands through the real shell,
 // with a stand-in dscl from `dir`.
 class ListingThenShellRunner : public ProcessGroupRunner {

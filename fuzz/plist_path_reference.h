@@ -1,8 +1,8 @@
 // The raw-tree conversion done the plain way: every leaf stored through
 // TagTree::setValue with its full path. The converter walks with a cursor
-// instead; tests and the fuzzer check that both give the same tree.
-#ifndef CVN_TESTS_PLIST_PATH_REFERENCE_H_
-#define CVN_TESTS_PLIST_PATH_REFERENCE_H_
+// instead; the fuzzer checks that both give the same tree.
+#ifndef CVN_FUZZ_PLIST_PATH_REFERENCE_H_
+#define CVN_FUZZ_PLIST_PATH_REFERENCE_H_
 
 #include <string>
 
@@ -56,4 +56,4 @@ inline void convertPlist(TagTree& tree, const PlistValue& root) {
 }  // namespace reference
 }  // namespace cvn
 
-#endif  // CVN_TESTS_PLIST_PATH_REFERENCE_H_
+#endif  // CVN_FUZZ_PLIST_PATH_REFERENCE_H_
