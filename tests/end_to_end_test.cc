@@ -449,16 +449,17 @@ TEST_F(EndToEndTest, BrokenHugeAndHostileToolOutputStillGivesACheckedFile) {
        },
        {{0, "/Software/Soft:Generated 5599 1.0", "", "Generated 5599"},
         {0, "/Software/Soft:Safari 5.1", "", "Safari"}}},
-      // One name of 150 MB: every text is cut at 1 MiB on a UTF-8 boundary,
-      // so the file stays one that a reader can inflate. "Soft:" is odd, so
-      // the record name's cut would split an é.
+      // One name of 16 MiB, across many of the reader's 1 MiB chunks: every
+      // text is cut at 1 MiB on a UTF-8 boundary, so the file stays one that
+      // a reader can inflate. "Soft:" is odd, so the record name's cut would
+      // split an é.
       {"a huge application name",
        true,
        "",
        [&](const std::string& mac) {
          std::string huge;
-         huge.reserve(150u << 20);
-         while (huge.size() < (150u << 20)) huge += "\xC3\xA9";
+         huge.reserve(16u << 20);
+         while (huge.size() < (16u << 20)) huge += "\xC3\xA9";
          replaceIn(mac + "/" + apps, "<string>Safari</string>", "<string>" + huge + "</string>");
        },
        {{0, "/Software/Soft:" + huge_name, "", huge_name + "\xC3\xA9\xC3\xA9\xC3\xA9"}}},

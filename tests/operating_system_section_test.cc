@@ -4,10 +4,6 @@
 
 #include <string>
 
-#include "sections/sections.h"
-#include "tree_text.h"
-#include "zxml/tag.h"
-
 namespace cvn {
 namespace {
 
@@ -42,38 +38,6 @@ TEST(OsVersionTest, UptimeBecomesADmtfInterval) {
                                   {"1:02:03:04", "00000000020304.000000:000"},
                                   {"up 12345678901:0:0:0", "345678901000000.000000:000"}};
   for (const auto& c : cases) EXPECT_EQ(formatDmtfInterval(uptimeSeconds(c[0])), c[1]) << c[0];
-}
-
-std::string buildOs(const char* os_version, const TagValue& flag, const TagValue& kernel) {
-  TagTree raw(true, "Macintosh"), snapshot(true, "Snapshot");
-  const std::string item = "/SPSoftwareDataType/_items/item0/";
-  raw.setValue(item + "os_version", os_version);
-  raw.setValue(item + "64bit_kernel_and_kexts", flag);
-  raw.setValue(item + "kernel_version", kernel);
-  raw.setValue(item + "uptime", "up 0:6:23:37");
-  buildOperatingSystemSection(snapshot, raw);
-  return treeText(snapshot.top().findChild("OS"));
-}
-
-TEST(OperatingSystemSectionTest, WholeSectionAndArchitecture) {
-  // The kernel flag is "yes" in lower case: "Yes" leaves Snow Leopard 32-bit.
-  EXPECT_EQ(buildOs("Mac OS X 10.6.8 (10K549)", "Yes", 11), R"txt(+OS=
-*os:1=
-~kind=mac
-name="Mac OS X v10.6 (Snow Leopard)"
-version="10.6.8 (10K549)"
-update="Update 8"
-kernel=11
-manuf="Apple Inc."
-uptime="00000000062337.000000:000"
-architecture="32-bit"
--
-)txt");
-  // Lion and later are always 64-bit.
-  const char* const cases[][2] = {
-      {"Mac OS X 10.6.8", "yes"}, {"Mac OS X 10.7.5", "no"}, {"macOS 11.2.3", ""}};
-  for (const auto& c : cases)
-    EXPECT_NE(buildOs(c[0], c[1], "").find("architecture=\"64-bit\""), std::string::npos) << c[0];
 }
 
 }  // namespace
