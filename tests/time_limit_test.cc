@@ -76,6 +76,10 @@ TEST(ProcessGroupRunnerTest, EveryCallEndsByItsLimitAndLeavesNothingOfItsGroup) 
       {"cannot start", "exec /nonexistent/tool 2>/dev/null", 64, "", false, false},
   };
   const size_t count = sizeof cases / sizeof cases[0];
+  auto open_files = [] {
+    return std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {});
+  };
+  const auto open_before = open_files();
   ProcessGroupRunner runner(grace);
   Clock::time_point started = Clock::now();
   std::vector<pid_t> groups;
@@ -100,6 +104,15 @@ TEST(ProcessGroupRunnerTest, EveryCallEndsByItsLimitAndLeavesNothingOfItsGroup) 
     EXPECT_EQ(runner.groupOf(id), -1) << c.what;
   }
   EXPECT_EQ(ended, std::vector<bool>(count, true));
+  EXPECT_EQ(open_files(), open_before) << "a pipe was left open";
+  pid_t abandoned_group = 0;
+  {
+    ProcessGroupRunner abandoned(grace);
+    abandoned.start(0, "sleep 30", 4, std::chrono::seconds(20));
+    abandoned_group = abandoned.groupOf(0);
+  }
+  EXPECT_EQ(liveMembersOf(abandoned_group), 0) << "a runner ends what it still runs";
+  EXPECT_EQ(open_files(), open_before) << "a runner closes what it still reads";
   EXPECT_EQ(runner.run("printf x", 1), "x") << "the runner serves again once all have ended";
 }
 
