@@ -82,5 +82,28 @@ TEST(EdidTest, DecodesIdentityDateDiagonalAndText) {
   }
 }
 
+// What the sample Macs' displays do not print: revision 4's range offsets
+// and colour encodings, a detailed timing without a height, and the
+// terminator after a standard-timing descriptor's six pairs.
+TEST(EdidTest, RevisionFourFieldsAndDescriptorEdges) {
+  const std::pair<std::string, const char*> cases[] = {
+      {edidText({{57, "fd0a1e2c0a14"}}), "30-299 10-275||Monochrome|"},
+      {edidText({{57, "fd0f1e2c0a14"}}), "285-299 265-275||Monochrome|"},
+      {edidText({{18, "0104"}, {20, "80"}, {24, "08"}}), "- -||RGB 4:4:4, YCrCb 4:4:4|"},
+      {edidText({{54, "0100800000"}, {21, "2f1e"}}), "- -||Monochrome|16:10"},
+      {edidText({{75, "fa"}, {87, "a9c00a"}}), "- -|1600 x 900 (16:9)|Monochrome|"},
+  };
+  for (const auto& [edid, expected] : cases) {
+    EdidInfo info;
+    ASSERT_TRUE(decodeEdidText(edid, &info));
+    std::string modes;
+    for (const std::string& mode : info.video_modes) modes += mode;
+    EXPECT_EQ(info.v_freq.min + "-" + info.v_freq.max + " " + info.h_freq.min + "-" +
+                  info.h_freq.max + "|" + modes + "|" + info.color_features + "|" +
+                  info.aspect_ratio,
+              expected);
+  }
+}
+
 }  // namespace
 }  // namespace cvn
