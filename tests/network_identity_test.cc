@@ -84,7 +84,7 @@ TEST(NetworkIdentityTest, EdgeCases) {
   for (const auto& c : cases) {
     Plist root;
     ASSERT_TRUE(parsePlist(c.xml, &root));
-    NetworkIdentity out{"", 0, "kept", "", true};
+    NetworkIdentity out{"stale", 99, "kept", "stale", true};  // what a previous read left
     std::string ip = c.ip;
     EXPECT_EQ(readNetworkIdentity(root, ip, &out), out.workgroup);
     EXPECT_EQ(ip + "|" + out.workgroup + "|" + std::to_string(out.workgroup_length) + "|" +

@@ -14,6 +14,7 @@
 #include <string>
 #include <thread>
 
+#include "collect/interrupt_watch.h"
 #include "collect/process_group_runner.h"
 #include "corpus_files.h"
 #include "fake_command_runner.h"
@@ -114,6 +115,19 @@ TEST(ProcessGroupRunnerTest, EveryCallEndsByItsLimitAndLeavesNothingOfItsGroup) 
   EXPECT_EQ(liveMembersOf(abandoned_group), 0) << "a runner ends what it still runs";
   EXPECT_EQ(open_files(), open_before) << "a runner closes what it still reads";
   EXPECT_EQ(runner.run("printf x", 1), "x") << "the runner serves again once all have ended";
+}
+
+// A signal that arrives while tools run is held back; once the watch ends
+// it takes its usual course, as if no watch had been there.
+TEST(InterruptWatchTest, ASignalHeldBackEndsTheAgentOnceTheWatchEnds) {
+  for (int signal_number : {SIGINT, SIGTERM, SIGHUP}) {
+    EXPECT_EXIT(
+        {
+          InterruptWatch watch;
+          raise(signal_number);
+        },
+        ::testing::KilledBySignal(signal_number), "");
+  }
 }
 
 TEST(CommandRunnerTest, AToolThatHitItsLimitIsNamedOnceAndGivesWhatItPrinted) {
