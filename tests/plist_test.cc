@@ -85,6 +85,7 @@ TEST(PlistTest, ValueKinds) {
                 "s\"a\\x0D\\x0Ab\\x0D\\x01\\x1F\\x7F\\x00\\x1F\""},
                {"<string>\xFF\xC3(\xED\xA0\x80</string>", "s\"\\xFF\\xC3(\\xED\\xA0\\x80\""},
                {"<string>\xEF\x9C\x80&#xF701;</string>", "s\"\\xEF\\x9C\\x80\\xEF\\x9C\\x81\""},
+               {"<string>&#00000065;&#x0000004A;&lt;\x01</string>", "s\"AJ<\\x01\""},
                {"<string>&nbsp;</string>", ""},
                {"<string>&#xD800;</string>", ""}};
   for (const auto& c : cases) {
@@ -121,6 +122,7 @@ TEST(PlistTest, OddDocuments) {
       // A key without a value, a value without a key, a repeated key.
       {"<dict><key>a</key><key>b</key><integer>2</integer><string>lost</string></dict>", "{b:i2}"},
       {"<dict><key>a</key><true/><key>b</key><true/><key>a</key><false/></dict>", "{a:b0,b:b1}"},
+      {" \t\r\n<?xml version=\"1.0\"?><true/>", "b1"},
       {"<?xml version=\"1.0\"?>\r\n<!-- \x01 -->\r\n<?pi x?><dict><key>k\x01\r</key><true/></dict>",
        "{k\x01\r:b1}"},
   };
