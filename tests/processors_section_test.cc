@@ -68,6 +68,7 @@ TEST(ProcessorsSectionTest, ChipNamesAndCoreTexts) {
        "\"Apple M4 Max (Virtual)\" 4 4096 0 x1"},
       {{{"cpu_type", "Intel Core i7"}, {"chip_type", "Apple M1"}}, "\"Intel Core i7\" 1 0 0 x1"},
       // Only "proc" with three or four whole numbers is a core count.
+      {{{"number_processors", "proc 9:6:3"}}, "\"CPU #1\" 9 0 0 x1"},
       {{{"number_processors", "proc 8:4"}}, "\"CPU #1\" 0 0 0 x1"},
       {{{"number_processors", "proc 8:4:4:0:0"}}, "\"CPU #1\" 0 0 0 x1"},
       {{{"number_processors", "proc 8:x:4"}}, "\"CPU #1\" 0 0 0 x1"},

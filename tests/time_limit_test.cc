@@ -3,10 +3,12 @@
 #include <gtest/gtest.h>
 #include <signal.h>
 #include <spawn.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <chrono>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -115,6 +117,29 @@ TEST(ProcessGroupRunnerTest, EveryCallEndsByItsLimitAndLeavesNothingOfItsGroup) 
   EXPECT_EQ(liveMembersOf(abandoned_group), 0) << "a runner ends what it still runs";
   EXPECT_EQ(open_files(), open_before) << "a runner closes what it still reads";
   EXPECT_EQ(runner.run("printf x", 1), "x") << "the runner serves again once all have ended";
+}
+
+// A launcher may leave SIGCHLD ignored, so that the kernel reaps the tools
+// itself; and with no file descriptor left, a tool cannot start but still
+// ends its call.
+TEST(ProcessGroupRunnerTest, ToolsEndWhereTheKernelReapsThemOrNoPipeIsLeft) {
+  auto reaped_by_the_kernel = [] {
+    alarm(5);
+    std::signal(SIGCHLD, SIG_IGN);
+    ProcessGroupRunner runner;
+    std::_Exit(runner.run("printf x", 1) == "x" ? 0 : 1);
+  };
+  auto without_a_pipe = [] {
+    const rlimit only_the_standard_streams = {3, 3};
+    setrlimit(RLIMIT_NOFILE, &only_the_standard_streams);
+    ProcessGroupRunner runner;
+    runner.start(7, "printf x", 1, std::chrono::seconds(5));
+    int id = 0;
+    ToolOutput output{"unset", true};
+    std::_Exit(runner.waitForOne(&id, &output) && id == 7 && output.text.empty() ? 0 : 1);
+  };
+  EXPECT_EXIT(reaped_by_the_kernel(), ::testing::ExitedWithCode(0), "");
+  EXPECT_EXIT(without_a_pipe(), ::testing::ExitedWithCode(0), "");
 }
 
 // A signal that arrives while tools run is held back; once the watch ends
