@@ -82,13 +82,15 @@ TEST(EdidTest, DecodesIdentityDateDiagonalAndText) {
   }
 }
 
-// What the sample Macs' displays do not print: revision 4's range offsets
-// and colour encodings, a detailed timing without a height, and the
-// terminator after a standard-timing descriptor's six pairs.
+// What the sample Macs' displays do not print: range limits in any of the
+// four descriptors and revision 4's offsets to them, colour encodings, a
+// detailed timing without a height, and the terminator after a
+// standard-timing descriptor's six pairs.
 TEST(EdidTest, RevisionFourFieldsAndDescriptorEdges) {
   const std::pair<std::string, const char*> cases[] = {
       {edidText({{57, "fd0a1e2c0a14"}}), "30-299 10-275||Monochrome|"},
-      {edidText({{57, "fd0f1e2c0a14"}}), "285-299 265-275||Monochrome|"},
+      {edidText({{93, "fd0f1e2c0a14"}}), "285-299 265-275||Monochrome|"},
+      {edidText({{111, "fd001e2c0a14"}}), "30-44 10-20||Monochrome|"},
       {edidText({{18, "0104"}, {20, "80"}, {24, "08"}}), "- -||RGB 4:4:4, YCrCb 4:4:4|"},
       {edidText({{54, "0100800000"}, {21, "2f1e"}}), "- -||Monochrome|16:10"},
       {edidText({{75, "fa"}, {87, "a9c00a"}}), "- -|1600 x 900 (16:9)|Monochrome|"},
