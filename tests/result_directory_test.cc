@@ -40,9 +40,15 @@ class FaultyDisk : public WorkingDirectory {
   size_t room = SIZE_MAX;
   int link_error = 0;
   int signal_number = 0;
+  std::vector<std::string> seen_while_writing;
 
  protected:
   ssize_t writeSome(int fd, const uint8_t* data, size_t size) override {
+    if (seen_while_writing.empty()) {
+      for (const auto& entry : std::filesystem::directory_iterator(path()))
+        seen_while_writing.push_back(entry.path().filename().string());
+      std::sort(seen_while_writing.begin(), seen_while_writing.end());
+    }
     if (signal_number) {
       EXPECT_EQ(WorkingDirectory::writeSome(fd, data, size / 2), static_cast<ssize_t>(size / 2));
       raise(signal_number);
@@ -128,11 +134,24 @@ TEST_F(ResultDirectoryTest, AFailedSaveLeavesOnlyTheEarlierResult) {
       {"no hard links here either", SIZE_MAX, ENOTSUP, SaveOutcome::kSaved},
   };
   std::ofstream(at("earlier.qax")) << "earlier result";
+  // Whatever the outcome, the save gives back the signals it held and the
+  // files it opened, and writes beside the result under a hidden name.
+  auto held_and_open = [] {
+    sigset_t held;
+    sigprocmask(SIG_BLOCK, nullptr, &held);
+    return std::to_string(sigismember(&held, SIGINT) + sigismember(&held, SIGTERM)) + " " +
+           std::to_string(std::distance(std::filesystem::directory_iterator("/proc/self/fd"), {}));
+  };
+  const std::string before = held_and_open();
+  const std::vector<std::string> while_writing = {
+      ".cvnmacagent-" + std::to_string(getpid()) + ".tmp", "earlier.qax"};
   for (const auto& c : cases) {
     FaultyDisk disk(folder_);
     disk.room = c.room;
     disk.link_error = c.link_error;
     EXPECT_EQ(disk.writeFile(at("new.qax"), image_), c.outcome) << c.what;
+    EXPECT_EQ(held_and_open(), before) << c.what;
+    EXPECT_EQ(disk.seen_while_writing, while_writing) << c.what;
     if (c.outcome == SaveOutcome::kSaved) {
       EXPECT_EQ(readFile(at("new.qax")), std::string(image_.begin(), image_.end())) << c.what;
       EXPECT_EQ(disk.writeFile(at("new.qax"), {'x'}), SaveOutcome::kNameTaken) << c.what;
