@@ -87,6 +87,7 @@ TEST(PlistTest, ValueKinds) {
                {"<string>\xEF\x9C\x80&#xF701;</string>", "s\"\\xEF\\x9C\\x80\\xEF\\x9C\\x81\""},
                {"<string>&#00000065;&#x0000004A;&lt;\x01</string>", "s\"AJ<\\x01\""},
                {"<string>&nbsp;</string>", ""},
+               {"<string>&a1;</string>", ""},
                {"<string>&#xD800;</string>", ""}};
   for (const auto& c : cases) {
     std::string v = *c.expected ? std::string("v:") + c.expected + "," : "";
