@@ -16,6 +16,8 @@ TEST(OsVersionTest, SplitsTheProfilerText) {
       {"Mac OS X 10.x", "Mac OS X v10.0 (Cheetah)", "10.x||10.0"},
       {"Mac OS X 10.1.08", "Mac OS X v10.1 (Puma)", "10.1.08|Update 8|10.1"},
       {"Mac OS X 10.5.99999999999", "Mac OS X v10.5 (Leopard)", "10.5.99999999999||10.5"},
+      {"Mac OS X 10.5.123456789", "Mac OS X v10.5 (Leopard)",
+       "10.5.123456789|Update 123456789|10.5"},
       {"macOS 11.2.3 (20D91)", nullptr, "11.2.3 (20D91)|Update 3|11.2"},
       {"", nullptr, "||-1.-1"},
       {"OS X 10.99999999999999999999", nullptr, "10.99999999999999999999||10.999999999"},
