@@ -144,6 +144,7 @@ std::string build(const SectionCase& c) {
       {"users", [&] { buildUsersSection(snapshot, runner); }},
       {"applications", [&] { buildApplicationsSection(snapshot, raw); }},
       {"plugins", [&] { buildPlugInsSection(snapshot, files, runner); }},
+      {"processors", [&] { buildProcessorsSection(snapshot, raw); }},
       {"processes", [&] { buildProcessesSection(snapshot, raw); }},
       {"environment", [&] { buildEnvironmentSection(snapshot, runner); }},
       {"firewall", [&] { buildFirewallSection(snapshot, raw); }},
