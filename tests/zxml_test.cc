@@ -120,6 +120,8 @@ TEST(ZxmlTest, CollectedTextCannotWriteMarkup) {
       {"-", kName, "_"},
       {"~k\n-", kName, "_k -"},
       {"*x=1", kName, "_x_1"},
+      {"=", kName, "_"},
+      {std::string("\0", 1), kValue, ""},
       {"-1", kValue, "-1"},
       // Cut at the limit, backing off to the start of a split UTF-8 sequence.
       {almost + "ab", kValue, almost + "a"},
