@@ -39,5 +39,19 @@ TEST(ArenaTest, HandsOutAlignedDisjointRoomThatLivesAsLongAsItsAdopter) {
   EXPECT_GT(moved.bytesReserved(), 3u << 20);
 }
 
+// Short texts, the keys and names a document repeats, are stored once; a
+// longer one gets a copy of its own each time.
+TEST(ArenaTest, SharesTextsUpToSixtyFourBytes) {
+  Arena arena;
+  SharedTexts shared;
+  for (size_t length : {0, 64, 65}) {
+    const std::string text(length, 'k');
+    const std::string_view first = shared.share(text, arena);
+    EXPECT_EQ(shared.share(std::string(text), arena).data() == first.data(), length <= 64)
+        << length;
+    EXPECT_EQ(first, text);
+  }
+}
+
 }  // namespace
 }  // namespace cvn

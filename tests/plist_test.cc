@@ -1,5 +1,7 @@
 #include "collect/plist.h"
 
+#include "collect/plist_leaves.h"
+
 #include <gtest/gtest.h>
 
 #include <cstdint>
@@ -86,6 +88,7 @@ TEST(PlistTest, ValueKinds) {
                {"<string>\xFF\xC3(\xED\xA0\x80</string>", "s\"\\xFF\\xC3(\\xED\\xA0\\x80\""},
                {"<string>\xEF\x9C\x80&#xF701;</string>", "s\"\\xEF\\x9C\\x80\\xEF\\x9C\\x81\""},
                {"<string>&#00000065;&#x0000004A;&lt;\x01</string>", "s\"AJ<\\x01\""},
+               {"<string>a&#9;b&#10;c&#13;</string>", "s\"a\\x09b\\x0Ac\\x0D\""},
                {"<string>&nbsp;</string>", ""},
                {"<string>&a1;</string>", ""},
                {"<string>&#xD800;</string>", ""}};
@@ -95,6 +98,30 @@ TEST(PlistTest, ValueKinds) {
                      c.element + "<key>z</key><true/></dict></plist>"),
               "{a:s\"A\"," + v + "z:b1}")
         << c.element;
+  }
+}
+
+// Numbers as CoreFoundation reads them: its blanks around the sign, and the
+// names it takes for reals that are no number.
+TEST(PlistTest, NumbersTakeTheBlanksAndNamesCoreFoundationTakes) {
+  const std::pair<std::string, const char*> cases[] = {
+      {" \t\x7F\xA0-\xA0 5", "i-5 -"},
+      {"\xA0 -2.5", "- r-2.50"},
+      {"\xA1 5", "- -"},
+      {"\x80+0x1F", "i31 -"},
+      {"nAn", "- rnan"},
+      {"-Infinity", "- r-inf"},
+      {"+inf", "- rinf"},
+  };
+  for (const auto& [text, expected] : cases) {
+    int64_t integer = 0;
+    double real = 0;
+    char shown[32] = "-";
+    if (parsePlistReal(text, &real)) std::snprintf(shown, sizeof shown, "r%.2f", real);
+    EXPECT_EQ(
+        (parsePlistInteger(text, &integer) ? "i" + std::to_string(integer) : "-") + " " + shown,
+        expected)
+        << text;
   }
 }
 
