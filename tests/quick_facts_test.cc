@@ -89,6 +89,8 @@ TEST(QuickFactsTest, OlderAndOddForms) {
       // NVMe disks count, but not their containers.
       {{{"SPSerialATADataType", sata}, {"SPNVMeDataType", nvme}},
        "disks=1500.1\nvolumes=400.0\nfree=100.0\n"},
+      // An NVMe disk alone tells nothing of the volumes.
+      {{{"SPNVMeDataType", nvme}}, "disks=1000.0\nvolumes=\nfree=\n"},
   };
   for (const auto& c : cases) {
     std::string text = factsText(profilerList(c.types));
