@@ -93,7 +93,7 @@ class EndToEndTest : public ::testing::Test {
     ASSERT_EQ(std::system(("mkdir -p " + quote(work_) + " " + quote(root_ + "/state")).c_str()), 0);
     mac_dir_ = kSource + "/tests/sample_mac";
   }
-  void TearDown() override { std::system(("rm -rf " + quote(root_)).c_str()); }
+  void TearDown() override { std::filesystem::remove_all(root_); }
 
   /// A fresh private copy of the sample Mac that a test may edit.
   std::string copySampleMac() {
