@@ -6,11 +6,11 @@
 #include <string>
 #include <string_view>
 
-#include "plist_path_reference.h"
 #include "../tests/tree_text.h"
 #include "collect/network_identity.h"
 #include "collect/plist.h"
 #include "collect/plist_converter.h"
+#include "plist_path_reference.h"
 #include "zxml/tag.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
