@@ -139,7 +139,11 @@ TEST(ProcessGroupRunnerTest, ToolsEndWhereTheKernelReapsThemOrNoPipeIsLeft) {
     std::_Exit(runner.waitForOne(&id, &output) && id == 7 && output.text.empty() ? 0 : 1);
   };
   EXPECT_EXIT(reaped_by_the_kernel(), ::testing::ExitedWithCode(0), "");
+#ifndef __SANITIZE_ADDRESS__  // the sanitizers' runtime needs descriptors of its own
   EXPECT_EXIT(without_a_pipe(), ::testing::ExitedWithCode(0), "");
+#else
+  (void)without_a_pipe;
+#endif
 }
 
 // A signal that arrives while tools run is held back; once the watch ends
